@@ -1,0 +1,524 @@
+// The object factory: collection into maps, object paths, instances of lights and of the
+// capabilities record, and the far end of an association.
+#include "BlueLightObjFactory.h"
+
+#include <cstring>
+#include <map>
+#include <string>
+#include <vector>
+
+#include "BlueLight.h"
+#include "BlueLightNames.h"
+#include "KestaCommon.h"
+#include "KestaLocale.h"
+#include "KestaTrace.h"
+
+namespace Kesta {
+namespace BlueLightProvider {
+
+// Logger category of this unit.
+static const std::string loggerBlueLightObjFactory("Varnel.BlueLightObjFactory");
+
+namespace {
+
+constexpr const char* kSourceFile = "BlueLightObjFactory.cpp";
+
+// Fills a caller's status with a failure; a null status pointer is left alone.
+void setFailure(const CMPIBroker* broker, CMPIStatus* status, const char* text) {
+  if (status == nullptr) return;
+  status->rc = CMPI_RC_ERR_FAILED;
+  status->msg = broker != nullptr ? CMNewString(broker, text, nullptr) : nullptr;
+}
+
+// Sends a text to the broker's trace facility, ignoring its outcome.
+void traceToBroker(const CMPIBroker* broker, int level, const char* component, const char* text) {
+  if (broker == nullptr) return;
+  CMTraceMessage(broker, level, component, text, nullptr);
+}
+
+// The names of a property list (up to its first null entry), each mapped to itself.
+std::map<std::string, std::string> requestedPropertiesOf(const char** properties) {
+  std::map<std::string, std::string> requested;
+  if (properties == nullptr) return requested;
+  for (unsigned short index = 0; properties[index] != nullptr; ++index) {
+    requested[properties[index]] = properties[index];
+    if (index == 0xFFFF) break;  // the 16-bit counter would wrap onto the first entry again
+  }
+  return requested;
+}
+
+// The object path of a new instance, in the namespace of `ref` and with this system as host.
+// Null (or a path without a handle) when the broker could not make it.
+CMPIObjectPath* newClassPath(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                             const char* className, CMPIStatus* nameSpaceStatus,
+                             CMPIStatus* creationStatus) {
+  const char* nameSpace = nameSpaceOf(ref, nameSpaceStatus);
+  CMPIObjectPath* path = CMNewObjectPath(broker, nameSpace, className, creationStatus);
+  if (!isUsable(path)) return path;
+  CMSetNameSpace(path, nameSpaceOf(ref, nameSpaceStatus));
+  CMSetHostname(path, Kesta::getSystemName().c_str());
+  return path;
+}
+
+// A CMPI array of 16-bit values; null when the broker could not make it.
+CMPIArray* newUint16Array(const CMPIBroker* broker, const std::vector<unsigned short>& values,
+                          CMPIStatus* status) {
+  const auto count = static_cast<unsigned short>(values.size());
+  CMPIArray* array = CMNewArray(broker, count, CMPI_uint16, status);
+  if (array == nullptr) return nullptr;
+  for (unsigned short index = 0; index < count; ++index) {
+    CMPIUint16 value = values.at(index);
+    CMSetArrayElementAt(array, index, &value, CMPI_uint16);
+  }
+  return array;
+}
+
+}  // namespace
+
+// ---------------------------------------------------------------------------------------------
+// Construction and maps
+// ---------------------------------------------------------------------------------------------
+
+BlueLightFactory::BlueLightFactory() = default;
+
+BlueLightFactory::BlueLightFactory(bool collectLights, bool collectCapabilities) {
+  if (collectLights) {
+    // A failed collection leaves the map empty; the enumerations then report that there is
+    // nothing, each in its own way.
+    if (static_cast<unsigned short>(getBlueLightInstances(_blueLights)) == 0) {
+      _createBlueLightMap();
+    }
+  }
+  if (collectCapabilities) {
+    if (static_cast<unsigned short>(getBlueLightCapabilitiesInstances(_blueLightCapabilities)) ==
+        0) {
+      _createCapabilitiesMap();
+    }
+  }
+}
+
+BlueLightFactory::~BlueLightFactory() = default;
+
+void BlueLightFactory::_createBlueLightMap() {
+  // Counts are 16-bit throughout the module: with more lights than that, only the remainder is
+  // filed.
+  const auto count = static_cast<unsigned short>(_blueLights.size());
+  for (unsigned short index = 0; index < count; ++index) {
+    BlueLight light = _blueLights.at(index);
+    const std::string key = light.getDeviceID();
+    // Lights with the same stripped DeviceID share one entry; the later one wins.
+    _blueLightMap[key] = light;
+  }
+}
+
+void BlueLightFactory::_createCapabilitiesMap() {
+  const auto count = static_cast<unsigned short>(_blueLightCapabilities.size());
+  for (unsigned short index = 0; index < count; ++index) {
+    BlueLightCapabilities record = _blueLightCapabilities.at(index);
+    const std::string key = record.getInstanceID();
+    _capabilitiesMap[key] = record;
+  }
+}
+
+unsigned short BlueLightFactory::getNumberOfInstances() {
+  return static_cast<unsigned short>(_blueLightMap.size());
+}
+
+// ---------------------------------------------------------------------------------------------
+// Object paths
+// ---------------------------------------------------------------------------------------------
+
+int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref,
+                                                  std::vector<CMPIObjectPath*>& objectPaths,
+                                                  CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
+         << " status=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  if (_blueLightMap.empty()) {
+    traceToBroker(broker, kBrokerTraceInfo, BlueLightProfileProvider, "***No instance found***");
+    return 1;
+  }
+
+  for (const auto& entry : _blueLightMap) {
+    BlueLight light = entry.second;
+    CMPIObjectPath* path =
+        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightClass, status);
+    if (!isUsable(path)) {
+      setFailure(broker, status, "Create CMPIObjectPath failed.");
+      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
+                    "Create CMPIObjectPath                     failed for RecordLogClass.");
+      return 2;
+    }
+    CMSetNameSpace(path, nameSpaceOf(ref, status));
+    CMSetHostname(path, Kesta::getSystemName().c_str());
+    CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
+    CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
+    CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
+    CMAddKey(path, "SystemName", Kesta::getSystemName().c_str(), CMPI_chars);
+    objectPaths.push_back(path);
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+int BlueLightFactory::getAllBlueLightCapabilitiesCMPIObjPaths(
+    const CMPIBroker* broker, const CMPIObjectPath* ref, std::vector<CMPIObjectPath*>& objectPaths,
+    CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
+         << " status=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  if (_capabilitiesMap.empty()) {
+    traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+                  "***No instance found***");
+    return 1;
+  }
+
+  for (const auto& entry : _capabilitiesMap) {
+    BlueLightCapabilities record = entry.second;
+    CMPIObjectPath* path =
+        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightCapabilitiesClass, status);
+    if (!isUsable(path)) {
+      setFailure(broker, status, "Create CMPIObjectPath failed");
+      traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+                    "Create CMPIObjectPath failed for                     BlueLightCapabilities "
+                    "class");
+      return 2;
+    }
+    CMSetNameSpace(path, nameSpaceOf(ref, status));
+    CMSetHostname(path, Kesta::getSystemName().c_str());
+    CMAddKey(path, "InstanceID", record.getInstanceID().c_str(), CMPI_chars);
+    objectPaths.push_back(path);
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+// ---------------------------------------------------------------------------------------------
+// Light instances
+// ---------------------------------------------------------------------------------------------
+
+CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
+                                                      const CMPIObjectPath* ref,
+                                                      BlueLight bluelight, const char** properties,
+                                                      bool isObjPath, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " bluelight=" << &bluelight
+         << " properties=" << properties << " isObjPath=" << isObjPath << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  const std::map<std::string, std::string> requestedProperties = requestedPropertiesOf(properties);
+  const bool setAllProperties = properties == nullptr && !isObjPath;
+  const char* keyList[] = {"CreationClassName", "DeviceID", "SystemCreationClassName",
+                           "SystemName", nullptr};
+  auto wanted = [&](const char* name) {
+    return setAllProperties || requestedProperties.count(std::string(name)) != 0;
+  };
+
+  CMPIInstance* instance = nullptr;
+  CMPIObjectPath* path = newClassPath(broker, ref, BlueLightClass, status, nullptr);
+  if (isUsable(path)) {
+    instance = CMNewInstance(broker, path, nullptr);
+    if (!isUsable(instance)) instance = nullptr;
+  }
+  if (instance == nullptr) {
+    KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+    return nullptr;
+  }
+
+  CMSetPropertyFilter(instance, properties, keyList);
+  CMSetProperty(instance, "CreationClassName", BlueLightClass, CMPI_chars);
+  CMSetProperty(instance, "DeviceID", bluelight.getDeviceID().c_str(), CMPI_chars);
+  CMSetProperty(instance, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
+  CMSetProperty(instance, "SystemName", Kesta::getSystemName().c_str(), CMPI_chars);
+
+  if (wanted("Caption")) {
+    // The lookup finds some text in every case (the platform falls back to English), so the
+    // result is used as it comes.
+    const std::wstring messageId = L"MSGID_ALARMDEVICE_CAPTION";
+    const std::string languageId = Kesta::Locale::getLanguageId();
+    const std::wstring resourceLibrary =
+        Kesta::Locale::getResourceLibrary(Kesta::Locale::kResourceKindMessages, languageId);
+    const std::wstring caption = Kesta::ResourceString(resourceLibrary, messageId).str();
+    CMSetProperty(instance, "Caption", Kesta::make_string(caption).c_str(), CMPI_chars);
+  }
+  if (wanted("Description")) {
+    CMSetProperty(instance, "Description", bluelight.getElementName().c_str(), CMPI_chars);
+  }
+  if (wanted("Name")) {
+    CMSetProperty(instance, "Name", bluelight.getElementName().c_str(), CMPI_chars);
+  }
+  if (wanted("ElementName")) {
+    CMSetProperty(instance, "ElementName", bluelight.getElementName().c_str(), CMPI_chars);
+  }
+  if (wanted("RequestedState")) {
+    CMPIUint16 value = bluelight.getRequestedState();
+    CMSetProperty(instance, "RequestedState", &value, CMPI_uint16);
+  }
+  if (wanted("HealthState")) {
+    CMPIUint16 value = bluelight.getHealthState();
+    CMSetProperty(instance, "HealthState", &value, CMPI_uint16);
+  }
+  if (wanted("OperationalStatus")) {
+    CMPIArray* array = newUint16Array(broker, bluelight.getOperationalStatus(), status);
+    if (array == nullptr) {
+      // The partly built instance is still handed out; the exit line is left out on purpose.
+      setFailure(broker, status,
+                 "Create Array for Property                         OperationalStatus failed.");
+      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
+                    "Create Array for Property Operat                        ionalStatus failed.");
+      return instance;
+    }
+    CMSetProperty(instance, "OperationalStatus", &array, CMPI_uint16A);
+  }
+  if (wanted("AudibleAlarm")) {
+    CMPIBoolean value = bluelight.getAudibleAlarm() ? 1 : 0;
+    CMSetProperty(instance, "AudibleAlarm", &value, CMPI_boolean);
+  }
+  if (wanted("VisibleAlarm")) {
+    CMPIBoolean value = bluelight.getVisibleAlarm() ? 1 : 0;
+    CMSetProperty(instance, "VisibleAlarm", &value, CMPI_boolean);
+  }
+  if (wanted("MotionAlarm")) {
+    CMPIBoolean value = bluelight.getMotionAlarm() ? 1 : 0;
+    CMSetProperty(instance, "MotionAlarm", &value, CMPI_boolean);
+  }
+  if (wanted("AlarmState")) {
+    CMPIUint16 value = bluelight.getAlarmState();
+    CMSetProperty(instance, "AlarmState", &value, CMPI_uint16);
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return instance;
+}
+
+int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref, CMPIString* key,
+                                                  const char** properties,
+                                                  std::vector<CMPIInstance*>& instances,
+                                                  CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " key=" << key
+         << " properties=" << properties << " instances=" << &instances << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  // A missing key or one without characters names no light.
+  const char* keyChars = charsOf(key, status);
+  if (keyChars == nullptr) return 1;
+  const auto found = _blueLightMap.find(std::string(keyChars));
+  if (found == _blueLightMap.end()) return 1;
+
+  BlueLight light = found->second;
+  instances.push_back(makeBlueLightInstance(broker, ref, light, properties, false, status));
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
+                                                   const CMPIObjectPath* ref,
+                                                   const char** properties, bool isObjPath,
+                                                   std::vector<CMPIInstance*>& instances,
+                                                   CMPIStatus* status) {
+  // The last key has no leading blank; the line has always been written so.
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
+         << " isObjPath=" << isObjPath << " instances=" << &instances << "rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  for (const auto& entry : _blueLightMap) {
+    BlueLight light = entry.second;
+    instances.push_back(makeBlueLightInstance(broker, ref, light, properties, isObjPath, status));
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+// ---------------------------------------------------------------------------------------------
+// Capabilities instances
+// ---------------------------------------------------------------------------------------------
+
+CMPIInstance* BlueLightFactory::makeBlueLightCapabilitiesInstance(
+    const CMPIBroker* broker, const CMPIObjectPath* ref,
+    BlueLightCapabilities bluelightCapabilities, const char** properties, bool isObjPath,
+    CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " bluelightCap=" << &bluelightCapabilities
+         << " properties=" << properties << " IsObjPath=" << isObjPath << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  const std::map<std::string, std::string> requestedProperties = requestedPropertiesOf(properties);
+  const bool setAllProperties = properties == nullptr && !isObjPath;
+  const char* keyList[] = {"InstanceID", nullptr};
+
+  CMPIInstance* result = nullptr;
+  CMPIObjectPath* path = newClassPath(broker, ref, BlueLightCapabilitiesClass, status, status);
+  if (isUsable(path)) {
+    CMPIInstance* instance = CMNewInstance(broker, path, nullptr);
+    // An instance without a handle is handed back as it is, with nothing set on it.
+    result = instance;
+    if (isUsable(instance)) {
+      CMSetPropertyFilter(instance, properties, keyList);
+      CMSetProperty(instance, "InstanceID", bluelightCapabilities.getInstanceID().c_str(),
+                    CMPI_chars);
+      if (setAllProperties || requestedProperties.count("RequestedAlarmStatesSupported") != 0) {
+        CMPIArray* array =
+            newUint16Array(broker, bluelightCapabilities.getAlarmStatesSupported(), status);
+        if (array == nullptr) {
+          // The two texts differ in the case of "array" and both are kept as they stand.
+          setFailure(broker, status,
+                     "Creating array for Property                         "
+                     "RequestedAlarmStatesSupported failed.");
+          traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+                        "Creating Array for Property                         "
+                        "RequestedAlarmStatesSupported failed.");
+        } else {
+          CMSetProperty(instance, "RequestedAlarmStatesSupported", &array, CMPI_uint16A);
+        }
+      }
+    }
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return result;
+}
+
+int BlueLightFactory::getAllBlueLightCapabilitiesCMPIInstances(
+    const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties, bool isObjPath,
+    std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
+         << " isObjPath=" << isObjPath << " instances=" << &instances << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  for (const auto& entry : _capabilitiesMap) {
+    BlueLightCapabilities record = entry.second;
+    instances.push_back(
+        makeBlueLightCapabilitiesInstance(broker, ref, record, properties, isObjPath, status));
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+int BlueLightFactory::getOneBlueLightCapabilitiesCMPIInstance(
+    const CMPIBroker* broker, const CMPIObjectPath* ref, CMPIString* key, const char** properties,
+    std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " key=" << key
+         << " properties=" << properties << " instances=" << &instances << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  const char* keyChars = charsOf(key, status);
+  if (keyChars == nullptr) return 1;
+  const auto found = _capabilitiesMap.find(std::string(keyChars));
+  if (found == _capabilitiesMap.end()) return 1;
+
+  BlueLightCapabilities record = found->second;
+  instances.push_back(
+      makeBlueLightCapabilitiesInstance(broker, ref, record, properties, false, status));
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+// ---------------------------------------------------------------------------------------------
+// Association targets
+// ---------------------------------------------------------------------------------------------
+
+namespace {
+
+// One row of the association decision table.
+struct AssociationTarget {
+  const char* sourceClass;
+  const char* associationClass;
+  const char* targetClass;
+  const char* component;
+  const char* text;
+};
+
+const AssociationTarget kAssociationTargets[] = {
+    {ComputerSystemClass, BlueLightSystemDeviceClass, BlueLightClass,
+     BlueLightSystemDeviceProvider, "Target Class is BlueLightClass"},
+    {BlueLightClass, BlueLightSystemDeviceClass, ComputerSystemClass,
+     BlueLightSystemDeviceProvider, "Target Class is ComputerSystemClass"},
+    {BlueLightClass, BlueLightElementCapabilitiesClass, BlueLightCapabilitiesClass,
+     BlueLightElementCapabilitiesProvider, "Target Class is BlueLightCapabilitiesClass"},
+    {BlueLightCapabilitiesClass, BlueLightElementCapabilitiesClass, BlueLightClass,
+     BlueLightElementCapabilitiesProvider, "Target Class is BlueLightClass"},
+};
+
+// True when both texts exist and are equal, byte for byte.
+bool sameText(const char* first, const char* second) {
+  return first != nullptr && second != nullptr && std::strcmp(first, second) == 0;
+}
+
+}  // namespace
+
+const char* BlueLightFactory::get_assoc_targetClass_Name(const CMPIBroker* broker,
+                                                         const CMPIObjectPath* ref,
+                                                         const char* _RefLeftClass,
+                                                         const char* _RefRightClass,
+                                                         CMPIStatus* status) {
+  // The class names go through the stream's text inserter: a null one stops the list there.
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    std::ostream& stream = list << " broker=" << broker;
+    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
+           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  // A null association class (sent by object managers when the client names none) matches no
+  // row, and neither does a path without a class.
+  CMPIString* sourceClass = isUsable(ref) ? CMGetClassName(ref, status) : nullptr;
+  for (const AssociationTarget& row : kAssociationTargets) {
+    if (!sameText(charsOf(sourceClass, status), row.sourceClass)) continue;
+    if (!sameText(_RefLeftClass, row.associationClass)) continue;
+    traceToBroker(broker, kBrokerTraceInfo, row.component, row.text);
+    KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+    return row.targetClass;
+  }
+  return nullptr;
+}
+
+CMPIObjectPath* BlueLightFactory::get_assoc_targetClass_ObjectPath(const CMPIBroker* broker,
+                                                                   const CMPIObjectPath* ref,
+                                                                   const char* _RefLeftClass,
+                                                                   const char* _RefRightClass,
+                                                                   CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    std::ostream& stream = list << " broker=" << broker;
+    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
+           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
+  };
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  CMPIObjectPath* result = nullptr;
+  const char* target =
+      get_assoc_targetClass_Name(broker, ref, _RefLeftClass, _RefRightClass, status);
+  if (target != nullptr) {
+    // The path names the class only: no keys.
+    result = newClassPath(broker, ref, target, status, status);
+  }
+
+  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return result;
+}
+
+}  // namespace BlueLightProvider
+}  // namespace Kesta
