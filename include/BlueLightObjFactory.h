@@ -86,6 +86,9 @@ class BlueLightFactory {
                                                    const char* _RefRightClass, CMPIStatus* status);
 
  private:
+  // Lets the unit tests look at the collected records and the maps.
+  friend struct BlueLightFactoryInspector;
+
   void _createBlueLightMap();
   void _createCapabilitiesMap();
 

@@ -1,0 +1,20 @@
+#!/usr/bin/env bash
+# Builds the project and runs every test.
+#   scripts/test.sh                      plain build in build/
+#   SANITIZERS=address,undefined scripts/test.sh    build in build-address-undefined/
+#   SANITIZERS=thread TESTS='concurrency' scripts/test.sh   only tests matching a regex
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+sanitizers="${SANITIZERS:-}"
+build_dir="${BUILD_DIR:-build${sanitizers:+-${sanitizers//,/-}}}"
+jobs="${JOBS:-$(nproc 2>/dev/null || echo 2)}"
+
+cmake -S . -B "$build_dir" -DCMAKE_BUILD_TYPE="${BUILD_TYPE:-RelWithDebInfo}" \
+  -DBLUELIGHT_SANITIZERS="$sanitizers" >/dev/null
+cmake --build "$build_dir" -j "$jobs"
+
+ctest_args=(--test-dir "$build_dir" --output-on-failure -j "$jobs")
+if [[ -n "${TESTS:-}" ]]; then ctest_args+=(-R "$TESTS"); fi
+if [[ -n "${EXCLUDE:-}" ]]; then ctest_args+=(-E "$EXCLUDE"); fi
+ctest "${ctest_args[@]}"
