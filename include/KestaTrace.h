@@ -9,6 +9,7 @@
 #include <exception>
 #include <ostream>
 #include <string>
+#include <type_traits>
 
 #include "VNLog.h"
 
@@ -94,7 +95,9 @@ inline char* tracepara(const char* file, const char* text, unsigned int line,
 }
 
 // Writes a pointer into a parameter list the way a standard stream prints a const void*.
-template <typename T>
+// Character pointers are texts, not addresses: they keep the buffer's own inserter.
+template <typename T,
+          typename = std::enable_if_t<!std::is_same_v<std::remove_cv_t<T>, char>>>
 std::ostream& operator<<(VNLog::VNMessageBuffer& buffer, T* pointer) {
   std::ostream& stream = buffer;
   return stream << static_cast<const void*>(pointer);

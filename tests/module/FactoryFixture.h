@@ -81,12 +81,14 @@ class FactoryTest : public ::testing::Test {
 
   std::vector<cmpihost::TraceRecord> brokerTraces() const { return broker_.traces(); }
 
-  static cmpihost::TraceRecord brokerTrace(int level, const std::string& component,
-                                           const std::string& text) {
+  // A trace the provider sent during the test's request.
+  cmpihost::TraceRecord brokerTrace(int level, const std::string& component,
+                                    const std::string& text) const {
     cmpihost::TraceRecord record;
     record.level = level;
     record.component = component;
     record.text = text;
+    record.requestId = request_->id();
     return record;
   }
 

@@ -190,12 +190,11 @@ TEST_F(FactoryTest, SystemNameIsReadForTheHostAndAgainForTheKey) {
   // The broker saw the name as the host and as the SystemName key.
   std::vector<std::string> seen;
   for (const auto& call : broker_.calls()) {
-    if (call.function == "setHostname" || call.function == "addKey") {
-      seen.push_back(call.function + "(" + (call.args.empty() ? "" : call.args.back()) + ")");
-    }
+    if (call.function == "setHostname" || call.function == "addKey") seen.push_back(call.toString());
   }
   ASSERT_EQ(seen.size(), 5u);
   EXPECT_NE(seen[0].find(kSystemName), std::string::npos) << seen[0];
+  EXPECT_NE(seen[4].find("SystemName"), std::string::npos) << seen[4];
   EXPECT_NE(seen[4].find(kSystemName), std::string::npos) << seen[4];
 }
 

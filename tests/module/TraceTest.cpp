@@ -9,6 +9,7 @@
 
 namespace {
 
+using Kesta::operator<<;
 using Kesta::ENTERING;
 using Kesta::EXITING;
 using Kesta::MESSAGE;

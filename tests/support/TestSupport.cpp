@@ -197,6 +197,11 @@ std::vector<std::string> LogCapture::texts(const std::string& category,
   return result;
 }
 
+std::ostream& operator<<(std::ostream& out, const LogLine& line) {
+  return out << line.category << " " << line.level << " " << line.kind << " \"" << line.text
+             << "\"";
+}
+
 std::string maskPointers(const std::string& text) {
   static const std::regex pointer("0x[0-9a-fA-F]+");
   return std::regex_replace(text, pointer, "PTR");

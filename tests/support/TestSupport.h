@@ -5,6 +5,7 @@
 
 #include <map>
 #include <optional>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -77,6 +78,9 @@ struct LogLine {
            text == other.text;
   }
 };
+
+// For readable test failures.
+std::ostream& operator<<(std::ostream& out, const LogLine& line);
 
 // Points the logger at a file (VNLOG_SINK=file:..., VNLOG_LEVEL as given) for the lifetime of
 // the object, and reads back the lines written since the last clear().
