@@ -33,7 +33,13 @@ class VNMessageBuffer {
   static std::string str(std::ostream& stream);
 
  private:
-  std::ostringstream stream_;
+  // A distinct stream type lets str(std::ostream&) recognise the streams that come from a
+  // VNMessageBuffer and leave every other stream alone.
+  class Stream final : public std::ostringstream {};
+
+  static std::string take(Stream& stream);
+
+  Stream stream_;
 };
 
 // The logger. Configuration comes from the environment (see the README):

@@ -1,0 +1,94 @@
+#include "standalone/LogFormat.h"
+
+#include <syslog.h>
+
+#include <charconv>
+#include <string>
+
+#include "KestaCommon.h"
+
+namespace Kesta {
+namespace platform {
+
+namespace {
+
+void appendOneLine(std::string& out, std::string_view text) {
+  for (const char c : text) {
+    if (c == '\n') {
+      out += "\\n";
+    } else if (c == '\r') {
+      out += "\\r";
+    } else {
+      out.push_back(c);
+    }
+  }
+}
+
+const char* kindWord(LineKind kind) { return kind == LineKind::kLog ? "LOG" : "TRACE"; }
+
+// "<category><separator><level><separator><LOG|TRACE><separator><text>", on one line.
+std::string joinFields(std::string_view category, int level, LineKind kind, std::string_view text,
+                       char separator) {
+  std::string line;
+  line.reserve(category.size() + text.size() + 24);
+  appendOneLine(line, category);
+  line.push_back(separator);
+  line += std::to_string(level);
+  line.push_back(separator);
+  line += kindWord(kind);
+  line.push_back(separator);
+  appendOneLine(line, text);
+  return line;
+}
+
+}  // namespace
+
+std::string formatLogLine(std::string_view category, int level, LineKind kind,
+                          std::string_view text) {
+  return joinFields(category, level, kind, text, '\t') + '\n';
+}
+
+std::string formatSyslogMessage(std::string_view category, int level, LineKind kind,
+                                std::string_view text) {
+  return joinFields(category, level, kind, text, ' ');
+}
+
+int syslogPriority(int level, LineKind kind) {
+  if (kind == LineKind::kTrace) {
+    return LOG_DEBUG;
+  }
+  if (level >= 6000) {
+    return LOG_ERR;
+  }
+  if (level >= 5000) {
+    return LOG_WARNING;
+  }
+  if (level >= 4000) {
+    return LOG_NOTICE;
+  }
+  if (level >= 3000) {
+    return LOG_INFO;
+  }
+  return LOG_DEBUG;
+}
+
+std::optional<int> parseLogThreshold(std::string_view text) {
+  const std::string stripped = Kesta::stripSpaces(std::string(text));
+  std::string_view digits = stripped;
+  // from_chars takes a minus sign but not a plus sign; accept both.
+  if (!digits.empty() && digits.front() == '+') {
+    digits.remove_prefix(1);
+    if (!digits.empty() && digits.front() == '-') {
+      return std::nullopt;
+    }
+  }
+  int value = 0;
+  const auto [end, error] = std::from_chars(digits.data(), digits.data() + digits.size(), value);
+  if (digits.empty() || error != std::errc() || end != digits.data() + digits.size()) {
+    return std::nullopt;
+  }
+  return value;
+}
+
+}  // namespace platform
+}  // namespace Kesta
