@@ -1,0 +1,89 @@
+#include "MofFormat.h"
+
+#include <cstdio>
+#include <string>
+
+#include "PathText.h"
+#include "TextForms.h"
+
+namespace bluelight::cli {
+
+using cmpihost::InstanceValue;
+using cmpihost::Value;
+
+namespace {
+
+std::string charLiteral(CMPIUint64 code) {
+  if (code == '\'') return "'\\''";
+  if (code == '\\') return "'\\\\'";
+  if (code >= 0x20 && code < 0x7f) return "'" + std::string(1, static_cast<char>(code)) + "'";
+  char text[16];
+  std::snprintf(text, sizeof text, "'\\x%04X'", static_cast<unsigned int>(code & 0xFFFF));
+  return text;
+}
+
+// An embedded instance on one line, as the text of a string value.
+std::string inlineInstance(const InstanceValue& instance) {
+  std::string text = "instance of " + instance.className() + " {";
+  for (const cmpihost::Property& property : instance.properties()) {
+    text += " " + property.name + " = " + mofValue(property.value) + ";";
+  }
+  return text + " }";
+}
+
+}  // namespace
+
+std::string mofValue(const Value& value) {
+  if (value.isNull()) return "NULL";
+  if (value.isArray()) {
+    std::string text = "{";
+    const char* separator = "";
+    for (const Value& element : value.elements()) {
+      text += separator + mofValue(element);
+      separator = ", ";
+    }
+    return text + "}";
+  }
+  switch (value.type()) {
+    case CMPI_string:
+    case CMPI_dateTime:
+      return quote(value.asString());
+    case CMPI_ref:
+      return quote(formatPath(value.asReference()));
+    case CMPI_instance:
+      return quote(inlineInstance(value.asInstance()));
+    case CMPI_boolean:
+      return value.asBoolean() ? "TRUE" : "FALSE";
+    case CMPI_char16:
+      return charLiteral(value.asUnsigned());
+    case CMPI_uint8:
+    case CMPI_uint16:
+    case CMPI_uint32:
+    case CMPI_uint64:
+      return std::to_string(value.asUnsigned());
+    case CMPI_sint8:
+    case CMPI_sint16:
+    case CMPI_sint32:
+    case CMPI_sint64:
+      return std::to_string(value.asSigned());
+    case CMPI_real32:
+      return realText(value.asReal(), true);
+    case CMPI_real64:
+      return realText(value.asReal(), false);
+    default:
+      return value.toString();
+  }
+}
+
+std::string mofInstance(const InstanceValue& instance, bool pathComment) {
+  std::string text;
+  if (pathComment) text += "// " + formatPath(instance.path()) + "\n";
+  text += "instance of " + instance.className() + "\n{\n";
+  for (const cmpihost::Property& property : instance.properties()) {
+    text += "    " + property.name + " = " + mofValue(property.value) + ";\n";
+  }
+  text += "};\n";
+  return text;
+}
+
+}  // namespace bluelight::cli

@@ -1,0 +1,42 @@
+// Where the tool looks for the provider library.
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdio>
+#include <fstream>
+
+#include "LibraryLocation.h"
+
+namespace bluelight::cli {
+namespace {
+
+TEST(LibraryLocation, NextToTheToolFirstThenInstalled) {
+  const std::vector<std::string> candidates = libraryCandidates("/opt/kesta/bin/bluelight-cli");
+  ASSERT_GE(candidates.size(), 2u);
+  EXPECT_EQ(candidates.front(), "/opt/kesta/lib/libbluelightprofileprovider.so.1");
+  EXPECT_NE(std::find(candidates.begin(), candidates.end(),
+                      "/opt/kesta/" BLUELIGHT_CLI_TEST_INSTALL_LIBDIR
+                      "/cmpi/libbluelightprofileprovider.so.1"),
+            candidates.end());
+  EXPECT_EQ(candidates.back(), BLUELIGHT_CLI_TEST_INSTALLED_LIBRARY);
+}
+
+TEST(LibraryLocation, WithoutTheToolsPathOnlyTheInstalledPlace) {
+  EXPECT_EQ(libraryCandidates(""), std::vector<std::string>{BLUELIGHT_CLI_TEST_INSTALLED_LIBRARY});
+}
+
+TEST(LibraryLocation, FirstExistingFile) {
+  const std::string file = ::testing::TempDir() + "bluelight-cli-location-test.so";
+  std::ofstream(file) << "x";
+  EXPECT_EQ(firstExisting({"/nonexistent/a.so", ::testing::TempDir(), file}), file);
+  EXPECT_FALSE(firstExisting({"/nonexistent/a.so"}).has_value());
+  std::remove(file.c_str());
+}
+
+TEST(LibraryLocation, CurrentExecutableIsFound) {
+  const std::string self = currentExecutablePath("ignored");
+  EXPECT_NE(self.find("cli_unit_test"), std::string::npos) << self;
+}
+
+}  // namespace
+}  // namespace bluelight::cli
