@@ -1,4 +1,5 @@
-// Counts the calls of the creating functions and decides which of them fail.
+// Counts the calls of the creating functions and decides which of them fail, and which calls of
+// object functions leave their object without a handle.
 #pragma once
 
 #include <cmpihost/faults.h>
@@ -27,6 +28,12 @@ class FaultInjector {
   /// there are any.
   FaultDecision onCall(CreatingFunction function);
 
+  /// Counts one call of an object function on an object that has a handle, for the armed
+  /// InvalidateHandle faults of that function, and says whether the object must lose its handle
+  /// once the call has done its work. Cheap when no such fault is armed.
+  bool onObjectCall(const char* table, const char* function);
+
+  /// Throws std::invalid_argument for an InvalidateHandle fault with an invalid object function.
   FaultId arm(const Fault& fault);
   bool disarm(FaultId id);
   void clear();
@@ -47,7 +54,8 @@ class FaultInjector {
   void updateArmedFlagLocked();
 
   std::array<std::atomic<std::uint64_t>, kCreatingFunctionCount> counts_;
-  std::atomic<bool> anyArmed_{false};
+  std::atomic<bool> anyArmed_{false};            // a creating-function fault is armed
+  std::atomic<bool> anyInvalidateArmed_{false};  // an InvalidateHandle fault is armed
   mutable std::mutex mutex_;
   std::vector<Armed> faults_;  // in arming order; spent faults stay for fireCount()
   FaultId nextId_ = 1;

@@ -5,6 +5,7 @@
 #include <cmpift.h>
 #include <cmpihost/faults.h>
 
+#include <cstring>
 #include <string>
 #include <utility>
 #include <vector>
@@ -53,17 +54,34 @@ inline CMPIData nullData(CMPIType type = CMPI_null, CMPIValueState extraState = 
 
 // ---- Entering a table function ----------------------------------------------------------------
 
-/// The object a table function was called on, and its broker.
+/// The object a table function was called on, and its broker. Lives as long as the table
+/// function's call: when an InvalidateHandle fault fired for the call, the object loses its
+/// handle as this ends, after the function has done its work.
 template <class Self>
 struct Entered {
   Self* self = nullptr;        // null when the pointer was null or not of this type
   BrokerCore* core = nullptr;  // null when no broker can be found at all
 
+  Entered() = default;
+  Entered(Entered&& other) noexcept
+      : self(other.self),
+        core(other.core),
+        invalidateOnExit(std::exchange(other.invalidateOnExit, false)) {}
+  Entered(const Entered&) = delete;
+  Entered& operator=(const Entered&) = delete;
+  Entered& operator=(Entered&&) = delete;
+  ~Entered() {
+    if (invalidateOnExit && self != nullptr) self->clearHandle();
+  }
+
   bool usable() const { return self != nullptr && self->hasHandle(); }
+
+  bool invalidateOnExit = false;
 };
 
 /// Looks up the object and records the call. `moreArgs(args)` appends the arguments after the
-/// object's description; it runs only while recording.
+/// object's description; it runs only while recording. A call on an object of ours is also
+/// shown to the InvalidateHandle faults (release never is: it frees the object).
 template <class Self, class MoreArgs>
 Entered<Self> enter(const typename Self::CmpiType* object, const char* function,
                     MoreArgs&& moreArgs) {
@@ -77,6 +95,10 @@ Entered<Self> enter(const typename Self::CmpiType* object, const char* function,
       moreArgs(args);
       return args;
     });
+  }
+  if (entered.self != nullptr && entered.self->hasHandle() &&
+      std::strcmp(function, "release") != 0) {
+    entered.invalidateOnExit = entered.core->faults().onObjectCall(Self::kTableName, function);
   }
   return entered;
 }
@@ -120,6 +142,8 @@ typename Self::CmpiType* faultedResult(BrokerCore& core, const FaultDecision& de
     }
     case FaultKind::ErrorStatus:
       setRc(rc, core.makeStatus(decision.status));
+      return nullptr;
+    case FaultKind::InvalidateHandle:  // never decided for a creating function
       return nullptr;
   }
   return nullptr;

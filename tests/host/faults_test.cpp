@@ -149,6 +149,8 @@ TEST_P(EveryFaultTest, TheSecondCallFailsAsArmed) {
       EXPECT_EQ(second, nullptr);
       EXPECT_EQ(testing::statusOf(rc), StatusValue(CMPI_RC_ERR_ACCESS_DENIED, "injected"));
       break;
+    case FaultKind::InvalidateHandle:
+      FAIL() << "not a creating-function fault";
   }
 
   // The fault fired once; the third call works again.
@@ -162,7 +164,10 @@ TEST_P(EveryFaultTest, TheSecondCallFailsAsArmed) {
 
 TEST_P(EveryFaultTest, ANullRcPointerIsFine) {
   const auto [function, kind] = GetParam();
-  broker.armFault(Fault{function, 1, kind, StatusValue(CMPI_RC_ERR_FAILED), false});
+  Fault fault;
+  fault.function = function;
+  fault.kind = kind;
+  broker.armFault(fault);
   void* result = creatorFor(function).create(nullptr);
   EXPECT_EQ(result == nullptr, kind != FaultKind::NullHandle);
 }

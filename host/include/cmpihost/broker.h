@@ -108,6 +108,8 @@ class Broker {
 
   // ---- Faults -----------------------------------------------------------------------------
 
+  /// Arms a fault (see faults.h). Throws std::invalid_argument for an InvalidateHandle fault
+  /// whose object function is not valid().
   FaultId armFault(const Fault& fault);
   /// Disarms one fault; false when the id is unknown.
   bool disarmFault(FaultId id);
