@@ -1,0 +1,122 @@
+#include "BlackboxFixture.h"
+
+#include <stdexcept>
+
+namespace blackbox {
+
+testsupport::LogCapture& providerLog() {
+  static testsupport::LogCapture capture(0);
+  return capture;
+}
+
+cmpihost::ProviderLibrary& providerLibrary() {
+  providerLog();
+  static cmpihost::ProviderLibrary library(BLUELIGHT_PROVIDER_LIBRARY);
+  return library;
+}
+
+BlackboxTest::BlackboxTest()
+    : systemName_("KESTA_SYSTEM_NAME", kSystemName),
+      language_("KESTA_LANGUAGE", std::string("en")) {
+  providerLibrary();
+  useTree({});
+  useComputerSystems({kSystemName});
+  clearLog();
+}
+
+BlackboxTest::~BlackboxTest() = default;
+
+void BlackboxTest::useTree(const std::vector<testsupport::Node>& nodes) {
+  testsupport::writeTree(tree_, nodes);
+  source_.emplace("KESTA_INSTRUMENTATION", "file:" + tree_);
+}
+
+void BlackboxTest::useComputerSystems(const std::vector<std::string>& names) {
+  std::vector<cmpihost::InstanceValue> systems;
+  for (const std::string& name : names) {
+    cmpihost::InstanceValue system(computerSystemPath(name));
+    system.set("CreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+    system.set("Name", cmpihost::Value(name));
+    systems.push_back(system);
+  }
+  broker_.setUpcallInstances("KESTA_ComputerSystem", systems);
+}
+
+CMPIInstanceMI* BlackboxTest::instanceMI(const std::string& provider) {
+  cmpihost::Request request(broker_);
+  cmpihost::InstanceMILoad load =
+      cmpihost::createInstanceMI(providerLibrary(), provider, broker_, request);
+  if (!load.ok()) throw std::runtime_error(load.error);
+  return load.mi;
+}
+
+CMPIAssociationMI* BlackboxTest::associationMI(const std::string& provider) {
+  cmpihost::Request request(broker_);
+  cmpihost::AssociationMILoad load =
+      cmpihost::createAssociationMI(providerLibrary(), provider, broker_, request);
+  if (!load.ok()) throw std::runtime_error(load.error);
+  return load.mi;
+}
+
+cmpihost::ObjectPathValue BlackboxTest::classPath(const std::string& className,
+                                                  const std::string& nameSpace) {
+  return cmpihost::ObjectPathValue(nameSpace, className);
+}
+
+cmpihost::ObjectPathValue BlackboxTest::lightPath(const std::string& deviceID,
+                                                  const std::string& nameSpace) {
+  cmpihost::ObjectPathValue path(nameSpace, "KESTA_BlueLight");
+  path.addKey("CreationClassName", cmpihost::Value("KESTA_BlueLight"));
+  path.addKey("DeviceID", cmpihost::Value(deviceID));
+  path.addKey("SystemCreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+  path.addKey("SystemName", cmpihost::Value(kSystemName));
+  return path;
+}
+
+cmpihost::ObjectPathValue BlackboxTest::capabilitiesPath(const std::string& nameSpace) {
+  cmpihost::ObjectPathValue path(nameSpace, "KESTA_BlueLightCapabilities");
+  path.addKey("InstanceID", cmpihost::Value("KESTA:BlueLightCapabilities1"));
+  return path;
+}
+
+cmpihost::ObjectPathValue BlackboxTest::computerSystemPath(const std::string& name,
+                                                           const std::string& nameSpace) {
+  cmpihost::ObjectPathValue path(nameSpace, "KESTA_ComputerSystem");
+  path.addKey("CreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+  path.addKey("Name", cmpihost::Value(name));
+  return path;
+}
+
+std::vector<std::string> BlackboxTest::log(const std::string& category,
+                                           const std::string& kind) const {
+  std::vector<std::string> texts;
+  for (const std::string& text : providerLog().texts(category, kind)) {
+    texts.push_back(testsupport::maskLineNumbers(testsupport::maskPointers(text)));
+  }
+  return texts;
+}
+
+std::vector<testsupport::LogLine> BlackboxTest::logLines() const { return providerLog().lines(); }
+
+void BlackboxTest::clearLog() { providerLog().clear(); }
+
+std::vector<std::string> BlackboxTest::traces(const cmpihost::Outcome& outcome) {
+  std::vector<std::string> texts;
+  for (const cmpihost::TraceRecord& record : outcome.traces) {
+    texts.push_back(std::to_string(record.level) + " " + record.component.value_or("(null)") +
+                    ": " + record.text.value_or("(null)"));
+  }
+  return texts;
+}
+
+std::string entering(const std::string& function, const std::string& file,
+                     const std::string& list) {
+  return "ENTERING: " + function + "() in " + file + " [Line: N],Parameters List: " + list;
+}
+
+std::string exiting(const std::string& function, const std::string& file,
+                    const std::string& list) {
+  return "EXITING: " + function + "() in " + file + " [Line: N],Parameters List: " + list;
+}
+
+}  // namespace blackbox
