@@ -114,8 +114,7 @@ std::string entering(const std::string& function, const std::string& file,
   return "ENTERING: " + function + "() in " + file + " [Line: N],Parameters List: " + list;
 }
 
-std::string exiting(const std::string& function, const std::string& file,
-                    const std::string& list) {
+std::string exiting(const std::string& function, const std::string& file, const std::string& list) {
   return "EXITING: " + function + "() in " + file + " [Line: N],Parameters List: " + list;
 }
 

@@ -75,10 +75,8 @@ class BlackboxTest : public ::testing::Test {
 };
 
 // The entry or exit line of an operation as the tests compare it.
-std::string entering(const std::string& function, const std::string& file,
-                     const std::string& list);
-std::string exiting(const std::string& function, const std::string& file,
-                    const std::string& list);
+std::string entering(const std::string& function, const std::string& file, const std::string& list);
+std::string exiting(const std::string& function, const std::string& file, const std::string& list);
 
 }  // namespace blackbox
 
