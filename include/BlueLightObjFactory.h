@@ -63,9 +63,8 @@ class BlueLightFactory {
                                                   const char** properties, bool isObjPath,
                                                   CMPIStatus* status);
   // Every capabilities record; always 0.
-  int getAllBlueLightCapabilitiesCMPIInstances(const CMPIBroker* broker,
-                                               const CMPIObjectPath* ref, const char** properties,
-                                               bool isObjPath,
+  int getAllBlueLightCapabilitiesCMPIInstances(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                                               const char** properties, bool isObjPath,
                                                std::vector<CMPIInstance*>& instances,
                                                CMPIStatus* status);
   // The capabilities record whose InstanceID is `key`: 0 found, 1 not found.
@@ -91,11 +90,17 @@ class BlueLightFactory {
 
   void _createBlueLightMap();
   void _createCapabilitiesMap();
+  // The Caption of the lights in `languageId`. Looked up in the catalogue once per factory and
+  // language (a factory lives for one operation), since every light of an operation gets the
+  // same text and the lookup touches the file system.
+  const std::string& _captionFor(const std::string& languageId);
 
   std::vector<BlueLight> _blueLights;
   std::vector<BlueLightCapabilities> _blueLightCapabilities;
   std::map<std::string, BlueLight> _blueLightMap;
   std::map<std::string, BlueLightCapabilities> _capabilitiesMap;
+  std::string _captionLanguage;  // the language of _caption; empty until the first lookup
+  std::string _caption;
 };
 
 }  // namespace BlueLightProvider

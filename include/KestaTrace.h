@@ -51,8 +51,9 @@ inline char* trace(const char* file, const char* text, unsigned int line, Messag
                     detail::orNull(text), detail::orNull(file), lineNumber);
       break;
     case METHOD:
-      std::snprintf(messageBuffer, sizeof messageBuffer, "METHOD: %s() was invoked in %s [Line: %d]",
-                    detail::orNull(text), detail::orNull(file), lineNumber);
+      std::snprintf(messageBuffer, sizeof messageBuffer,
+                    "METHOD: %s() was invoked in %s [Line: %d]", detail::orNull(text),
+                    detail::orNull(file), lineNumber);
       break;
     case MESSAGE:
       std::snprintf(messageBuffer, sizeof messageBuffer, "MESSAGE [File: %s, Line: %d]: %s",
@@ -96,8 +97,7 @@ inline char* tracepara(const char* file, const char* text, unsigned int line,
 
 // Writes a pointer into a parameter list the way a standard stream prints a const void*.
 // Character pointers are texts, not addresses: they keep the buffer's own inserter.
-template <typename T,
-          typename = std::enable_if_t<!std::is_same_v<std::remove_cv_t<T>, char>>>
+template <typename T, typename = std::enable_if_t<!std::is_same_v<std::remove_cv_t<T>, char>>>
 std::ostream& operator<<(VNLog::VNMessageBuffer& buffer, T* pointer) {
   std::ostream& stream = buffer;
   return stream << static_cast<const void*>(pointer);
@@ -111,34 +111,30 @@ template <typename ParameterWriter>
 void emitTracePara(const char* function, const char* file, int line, const std::string& category,
                    int level, MessageType type, ParameterWriter&& writeParameters) {
   if (!VNLog::VNLogger::isEnabled(level)) return;
+  // The formatted line is handed to the logger as a string straight away: collecting it in a
+  // second message buffer first would only copy it through a string stream.
   VNLog::VNMessageBuffer parameters;
-  VNLog::VNMessageBuffer message;
 
   writeParameters(parameters);
   std::string list = VNLog::VNMessageBuffer::str(parameters);
-  message << tracepara(file, function, static_cast<unsigned int>(line), list.c_str(), type);
-  VNLog::VNLogger::logLevelMessage(function, file, line, category, level, nullptr, 0, 0,
-                                   VNLog::VNMessageBuffer::str(message));
+  std::string text(tracepara(file, function, static_cast<unsigned int>(line), list.c_str(), type));
+  VNLog::VNLogger::logLevelMessage(function, file, line, category, level, nullptr, 0, 0, text);
 
   writeParameters(parameters);
   list = VNLog::VNMessageBuffer::str(parameters);
-  message << tracepara(file, function, static_cast<unsigned int>(line), list.c_str(), type);
-  VNLog::VNLogger::traceLevelMessage(function, file, line, category, level, nullptr, 0, 0,
-                                     VNLog::VNMessageBuffer::str(message));
+  text.assign(tracepara(file, function, static_cast<unsigned int>(line), list.c_str(), type));
+  VNLog::VNLogger::traceLevelMessage(function, file, line, category, level, nullptr, 0, 0, text);
 }
 
 // As emitTracePara() without a parameter list; `text` as for trace().
-inline void emitTrace(const char* function, const char* file, int line,
-                      const std::string& category, int level, MessageType type,
-                      const char* text) {
+inline void emitTrace(const char* function, const char* file, int line, const std::string& category,
+                      int level, MessageType type, const char* text) {
   if (!VNLog::VNLogger::isEnabled(level)) return;
-  VNLog::VNMessageBuffer message;
-  message << trace(file, text, static_cast<unsigned int>(line), type);
-  VNLog::VNLogger::logLevelMessage(function, file, line, category, level, nullptr, 0, 0,
-                                   VNLog::VNMessageBuffer::str(message));
-  message << trace(file, text, static_cast<unsigned int>(line), type);
+  std::string formatted(trace(file, text, static_cast<unsigned int>(line), type));
+  VNLog::VNLogger::logLevelMessage(function, file, line, category, level, nullptr, 0, 0, formatted);
+  formatted.assign(trace(file, text, static_cast<unsigned int>(line), type));
   VNLog::VNLogger::traceLevelMessage(function, file, line, category, level, nullptr, 0, 0,
-                                     VNLog::VNMessageBuffer::str(message));
+                                     formatted);
 }
 
 // Level of entry, exit and informational lines.

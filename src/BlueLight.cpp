@@ -218,7 +218,7 @@ unsigned short setVector(std::vector<BlueLight>& lights, Kesta::Instrumentation&
         throw ProviderException("Failed while setting AlarmState");
       }
     }
-    lights.push_back(light);
+    lights.push_back(std::move(light));
     ++cursor;
   }
 
@@ -226,8 +226,7 @@ unsigned short setVector(std::vector<BlueLight>& lights, Kesta::Instrumentation&
   return 0;
 }
 
-unsigned short getBlueLightCapabilitiesInstances(
-    std::vector<BlueLightCapabilities>& capabilities) {
+unsigned short getBlueLightCapabilitiesInstances(std::vector<BlueLightCapabilities>& capabilities) {
   try {
     BlueLightCapabilities record;
     capabilities.push_back(record);

@@ -51,13 +51,20 @@ std::map<std::string, std::string> requestedPropertiesOf(const char** properties
 // Null (or a path without a handle) when the broker could not make it.
 CMPIObjectPath* newClassPath(const CMPIBroker* broker, const CMPIObjectPath* ref,
                              const char* className, CMPIStatus* nameSpaceStatus,
-                             CMPIStatus* creationStatus) {
+                             CMPIStatus* creationStatus, const std::string& systemName) {
   const char* nameSpace = nameSpaceOf(ref, nameSpaceStatus);
   CMPIObjectPath* path = CMNewObjectPath(broker, nameSpace, className, creationStatus);
   if (!isUsable(path)) return path;
   CMSetNameSpace(path, nameSpaceOf(ref, nameSpaceStatus));
-  CMSetHostname(path, Kesta::getSystemName().c_str());
+  CMSetHostname(path, systemName.c_str());
   return path;
+}
+
+CMPIObjectPath* newClassPath(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                             const char* className, CMPIStatus* nameSpaceStatus,
+                             CMPIStatus* creationStatus) {
+  return newClassPath(broker, ref, className, nameSpaceStatus, creationStatus,
+                      Kesta::getSystemName());
 }
 
 // A CMPI array of 16-bit values; null when the broker could not make it.
@@ -104,10 +111,9 @@ void BlueLightFactory::_createBlueLightMap() {
   // filed.
   const auto count = static_cast<unsigned short>(_blueLights.size());
   for (unsigned short index = 0; index < count; ++index) {
-    BlueLight light = _blueLights.at(index);
-    const std::string key = light.getDeviceID();
+    const BlueLight& light = _blueLights.at(index);
     // Lights with the same stripped DeviceID share one entry; the later one wins.
-    _blueLightMap[key] = light;
+    _blueLightMap[light.getDeviceID()] = light;
   }
 }
 
@@ -118,6 +124,19 @@ void BlueLightFactory::_createCapabilitiesMap() {
     const std::string key = record.getInstanceID();
     _capabilitiesMap[key] = record;
   }
+}
+
+const std::string& BlueLightFactory::_captionFor(const std::string& languageId) {
+  if (_captionLanguage.empty() || _captionLanguage != languageId) {
+    // The lookup finds some text in every case (the platform falls back to English), so the
+    // result is used as it comes.
+    const std::wstring messageId = L"MSGID_ALARMDEVICE_CAPTION";
+    const std::wstring resourceLibrary =
+        Kesta::Locale::getResourceLibrary(Kesta::Locale::kResourceKindMessages, languageId);
+    _caption = Kesta::make_string(Kesta::ResourceString(resourceLibrary, messageId).str());
+    _captionLanguage = languageId;
+  }
+  return _caption;
 }
 
 unsigned short BlueLightFactory::getNumberOfInstances() {
@@ -144,7 +163,7 @@ int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
   }
 
   for (const auto& entry : _blueLightMap) {
-    BlueLight light = entry.second;
+    const BlueLight& light = entry.second;
     CMPIObjectPath* path =
         CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightClass, status);
     if (!isUsable(path)) {
@@ -153,12 +172,13 @@ int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
                     "Create CMPIObjectPath                     failed for RecordLogClass.");
       return 2;
     }
+    const std::string systemName = Kesta::getSystemName();
     CMSetNameSpace(path, nameSpaceOf(ref, status));
-    CMSetHostname(path, Kesta::getSystemName().c_str());
+    CMSetHostname(path, systemName.c_str());
     CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
     CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
     CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
-    CMAddKey(path, "SystemName", Kesta::getSystemName().c_str(), CMPI_chars);
+    CMAddKey(path, "SystemName", systemName.c_str(), CMPI_chars);
     objectPaths.push_back(path);
   }
 
@@ -218,14 +238,16 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
 
   const std::map<std::string, std::string> requestedProperties = requestedPropertiesOf(properties);
   const bool setAllProperties = properties == nullptr && !isObjPath;
-  const char* keyList[] = {"CreationClassName", "DeviceID", "SystemCreationClassName",
-                           "SystemName", nullptr};
+  const char* keyList[] = {"CreationClassName", "DeviceID", "SystemCreationClassName", "SystemName",
+                           nullptr};
   auto wanted = [&](const char* name) {
     return setAllProperties || requestedProperties.count(std::string(name)) != 0;
   };
 
+  // One system name for the path and the key property, as they must agree.
+  const std::string systemName = Kesta::getSystemName();
   CMPIInstance* instance = nullptr;
-  CMPIObjectPath* path = newClassPath(broker, ref, BlueLightClass, status, nullptr);
+  CMPIObjectPath* path = newClassPath(broker, ref, BlueLightClass, status, nullptr, systemName);
   if (isUsable(path)) {
     instance = CMNewInstance(broker, path, nullptr);
     if (!isUsable(instance)) instance = nullptr;
@@ -239,26 +261,21 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
   CMSetProperty(instance, "CreationClassName", BlueLightClass, CMPI_chars);
   CMSetProperty(instance, "DeviceID", bluelight.getDeviceID().c_str(), CMPI_chars);
   CMSetProperty(instance, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
-  CMSetProperty(instance, "SystemName", Kesta::getSystemName().c_str(), CMPI_chars);
+  CMSetProperty(instance, "SystemName", systemName.c_str(), CMPI_chars);
 
   if (wanted("Caption")) {
-    // The lookup finds some text in every case (the platform falls back to English), so the
-    // result is used as it comes.
-    const std::wstring messageId = L"MSGID_ALARMDEVICE_CAPTION";
-    const std::string languageId = Kesta::Locale::getLanguageId();
-    const std::wstring resourceLibrary =
-        Kesta::Locale::getResourceLibrary(Kesta::Locale::kResourceKindMessages, languageId);
-    const std::wstring caption = Kesta::ResourceString(resourceLibrary, messageId).str();
-    CMSetProperty(instance, "Caption", Kesta::make_string(caption).c_str(), CMPI_chars);
+    const std::string& caption = _captionFor(Kesta::Locale::getLanguageId());
+    CMSetProperty(instance, "Caption", caption.c_str(), CMPI_chars);
   }
-  if (wanted("Description")) {
-    CMSetProperty(instance, "Description", bluelight.getElementName().c_str(), CMPI_chars);
-  }
-  if (wanted("Name")) {
-    CMSetProperty(instance, "Name", bluelight.getElementName().c_str(), CMPI_chars);
-  }
-  if (wanted("ElementName")) {
-    CMSetProperty(instance, "ElementName", bluelight.getElementName().c_str(), CMPI_chars);
+  // Description, Name and ElementName all carry the stripped element name.
+  const bool wantDescription = wanted("Description");
+  const bool wantName = wanted("Name");
+  const bool wantElementName = wanted("ElementName");
+  if (wantDescription || wantName || wantElementName) {
+    const std::string elementName = bluelight.getElementName();
+    if (wantDescription) CMSetProperty(instance, "Description", elementName.c_str(), CMPI_chars);
+    if (wantName) CMSetProperty(instance, "Name", elementName.c_str(), CMPI_chars);
+    if (wantElementName) CMSetProperty(instance, "ElementName", elementName.c_str(), CMPI_chars);
   }
   if (wanted("RequestedState")) {
     CMPIUint16 value = bluelight.getRequestedState();
@@ -307,8 +324,8 @@ int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
                                                   std::vector<CMPIInstance*>& instances,
                                                   CMPIStatus* status) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key
-         << " properties=" << properties << " instances=" << &instances << " rc=" << status;
+    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
+         << " instances=" << &instances << " rc=" << status;
   };
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
@@ -318,8 +335,7 @@ int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
   const auto found = _blueLightMap.find(std::string(keyChars));
   if (found == _blueLightMap.end()) return 1;
 
-  BlueLight light = found->second;
-  instances.push_back(makeBlueLightInstance(broker, ref, light, properties, false, status));
+  instances.push_back(makeBlueLightInstance(broker, ref, found->second, properties, false, status));
 
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
   return 0;
@@ -338,8 +354,8 @@ int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
   for (const auto& entry : _blueLightMap) {
-    BlueLight light = entry.second;
-    instances.push_back(makeBlueLightInstance(broker, ref, light, properties, isObjPath, status));
+    instances.push_back(
+        makeBlueLightInstance(broker, ref, entry.second, properties, isObjPath, status));
   }
 
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
@@ -419,8 +435,8 @@ int BlueLightFactory::getOneBlueLightCapabilitiesCMPIInstance(
     const CMPIBroker* broker, const CMPIObjectPath* ref, CMPIString* key, const char** properties,
     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key
-         << " properties=" << properties << " instances=" << &instances << " rc=" << status;
+    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
+         << " instances=" << &instances << " rc=" << status;
   };
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
@@ -453,10 +469,10 @@ struct AssociationTarget {
 };
 
 const AssociationTarget kAssociationTargets[] = {
-    {ComputerSystemClass, BlueLightSystemDeviceClass, BlueLightClass,
-     BlueLightSystemDeviceProvider, "Target Class is BlueLightClass"},
-    {BlueLightClass, BlueLightSystemDeviceClass, ComputerSystemClass,
-     BlueLightSystemDeviceProvider, "Target Class is ComputerSystemClass"},
+    {ComputerSystemClass, BlueLightSystemDeviceClass, BlueLightClass, BlueLightSystemDeviceProvider,
+     "Target Class is BlueLightClass"},
+    {BlueLightClass, BlueLightSystemDeviceClass, ComputerSystemClass, BlueLightSystemDeviceProvider,
+     "Target Class is ComputerSystemClass"},
     {BlueLightClass, BlueLightElementCapabilitiesClass, BlueLightCapabilitiesClass,
      BlueLightElementCapabilitiesProvider, "Target Class is BlueLightCapabilitiesClass"},
     {BlueLightCapabilitiesClass, BlueLightElementCapabilitiesClass, BlueLightClass,

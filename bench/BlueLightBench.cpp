@@ -1,0 +1,771 @@
+// Benchmarks of the provider library as an object manager drives it: the library is loaded with
+// dlopen into the in-process host and its operations are called through the MI tables. Next to
+// them run the two costs that no provider can avoid, measured in the same process:
+//
+//   floor  the host creating the same object paths and instances with the same properties
+//          through its broker tables, and handing them to the result (what a minimal provider
+//          makes the object manager spend);
+//   walk   the platform opening an instrumentation cursor on the same JSON tree and walking its
+//          nodes (what reading the hardware costs).
+//
+// The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
+// itself twice: once with the sink "none" and once with every line written to a file. Each run
+// measures the floor and the walk again, so every ratio compares figures taken side by side. The
+// parent prints the table and the ratios against the targets.
+//
+//   bluelight-bench [google-benchmark options] [--bench-library=<so>] [--bench-growth-ops=<n>]
+//                   [--bench-sinks=none,file]
+//
+// BENCH_STRICT=1 makes the exit status non-zero when a ratio misses its target.
+#include <benchmark/benchmark.h>
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <cmpimacs.h>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <iomanip>
+#include <iostream>
+#include <map>
+#include <memory>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+#include "AllocCounter.h"
+#include "KestaInstrumentation.h"
+#include "cmpihost/cmpihost.h"
+
+namespace {
+
+const std::vector<int> kLightCounts = {1, 16, 256, 4096};
+constexpr int kAssociationLights = 256;
+const std::string kSystemName = "bbhost.example";
+const std::string kNameSpace = "root/cimv2";
+
+// ---------------------------------------------------------------------------------------------
+// Options of one run
+// ---------------------------------------------------------------------------------------------
+
+struct Options {
+  std::string library = BLUELIGHT_PROVIDER_LIBRARY;
+  std::string sink;         // "none" or "file" in a child; empty in the parent
+  std::string resultsFile;  // where a child writes its figures
+  std::string sinks = "none,file";
+  long growthOps = 10000;
+  std::vector<std::string> benchmarkArgs;  // passed on to Google Benchmark
+};
+
+bool takeOption(const std::string& argument, const std::string& name, std::string& value) {
+  const std::string prefix = "--" + name + "=";
+  if (argument.compare(0, prefix.size(), prefix) != 0) return false;
+  value = argument.substr(prefix.size());
+  return true;
+}
+
+Options parseOptions(int argc, char** argv) {
+  Options options;
+  for (int i = 1; i < argc; ++i) {
+    const std::string argument = argv[i];
+    std::string value;
+    if (takeOption(argument, "bench-library", value)) {
+      options.library = value;
+    } else if (takeOption(argument, "bench-child", value)) {
+      options.sink = value;
+    } else if (takeOption(argument, "bench-results", value)) {
+      options.resultsFile = value;
+    } else if (takeOption(argument, "bench-sinks", value)) {
+      options.sinks = value;
+    } else if (takeOption(argument, "bench-growth-ops", value)) {
+      options.growthOps = std::stol(value);
+    } else {
+      options.benchmarkArgs.push_back(argument);
+    }
+  }
+  return options;
+}
+
+// ---------------------------------------------------------------------------------------------
+// Trees
+// ---------------------------------------------------------------------------------------------
+
+std::string scratchDirectory() {
+  static const std::string directory = [] {
+    const char* base = std::getenv("TMPDIR");
+    std::string pattern =
+        std::string(base != nullptr && *base != '\0' ? base : "/tmp") + "/bluelight-bench.XXXXXX";
+    if (::mkdtemp(pattern.data()) == nullptr) throw std::runtime_error("mkdtemp failed");
+    return pattern;
+  }();
+  return directory;
+}
+
+// The DeviceID the provider makes of light `index` of a tree.
+std::string deviceIDOf(int index) { return "Blue Light:1." + std::to_string(index + 1); }
+
+// A tree of `count` blue lights with a mix of node statuses and alarm states, and a few nodes of
+// other types in between that the provider skips, as in a real tree.
+std::string treeFile(int count) {
+  const std::string file = scratchDirectory() + "/tree-" + std::to_string(count) + ".json";
+  std::ofstream out(file);
+  out << "{\"nodes\": [\n";
+  const unsigned statuses[] = {1, 1, 1, 20, 24, 0};
+  for (int i = 0; i < count; ++i) {
+    if (i % 8 == 7) {
+      out << "  {\"type\": 7, \"path\": \"0." << i << "\", \"description\": \"Temperature\","
+          << " \"status\": 1},\n";
+    }
+    out << "  {\"type\": 26, \"path\": \"1." << (i + 1) << "\", \"description\": \"Blue Light\"";
+    const unsigned status = statuses[i % 6];
+    if (status != 0) out << ", \"status\": " << status;
+    out << ", \"properties\": {\"1\": " << (1 + i % 3) << "}}" << (i + 1 < count ? "," : "")
+        << "\n";
+  }
+  out << "]}\n";
+  if (!out) throw std::runtime_error("cannot write " + file);
+  return file;
+}
+
+void useTree(int count) {
+  static std::map<int, std::string> files;
+  auto found = files.find(count);
+  if (found == files.end()) found = files.emplace(count, treeFile(count)).first;
+  ::setenv("KESTA_INSTRUMENTATION", ("file:" + found->second).c_str(), 1);
+}
+
+// ---------------------------------------------------------------------------------------------
+// The provider, loaded once per process
+// ---------------------------------------------------------------------------------------------
+
+struct Provider {
+  explicit Provider(const std::string& path) : library(path) {
+    cmpihost::Request request(broker);
+    lights = load(cmpihost::createInstanceMI(library, "BlueLightProfileProvider", broker, request));
+    elementCapabilities = load(cmpihost::createAssociationMI(
+        library, "BlueLightElementCapabilitiesProvider", broker, request));
+    systemDevice = load(
+        cmpihost::createAssociationMI(library, "BlueLightSystemDeviceProvider", broker, request));
+    cmpihost::InstanceValue system(computerSystemPath());
+    system.set("CreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+    system.set("Name", cmpihost::Value(kSystemName));
+    broker.setUpcallInstances("KESTA_ComputerSystem", {system});
+  }
+
+  template <typename MI>
+  static MI* load(const cmpihost::MILoadResult<MI>& result) {
+    if (!result.ok()) throw std::runtime_error(result.error);
+    return result.mi;
+  }
+
+  static cmpihost::ObjectPathValue computerSystemPath() {
+    cmpihost::ObjectPathValue path(kNameSpace, "KESTA_ComputerSystem");
+    path.addKey("CreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+    path.addKey("Name", cmpihost::Value(kSystemName));
+    return path;
+  }
+
+  // A broker that records nothing: what an object manager keeps of an operation is its result.
+  cmpihost::Broker broker{cmpihost::BrokerOptions{
+      "cmpihost", 200, CMPI_MB_Class_0 | CMPI_MB_Supports_MemEnhancements, false}};
+  cmpihost::ProviderLibrary library;
+  CMPIInstanceMI* lights = nullptr;
+  CMPIAssociationMI* elementCapabilities = nullptr;
+  CMPIAssociationMI* systemDevice = nullptr;
+};
+
+Options options;
+std::unique_ptr<Provider> provider;
+
+cmpihost::ObjectPathValue lightClassPath() {
+  return cmpihost::ObjectPathValue(kNameSpace, "KESTA_BlueLight");
+}
+
+cmpihost::ObjectPathValue lightPath(int index) {
+  cmpihost::ObjectPathValue path = lightClassPath();
+  path.addKey("CreationClassName", cmpihost::Value("KESTA_BlueLight"));
+  path.addKey("DeviceID", cmpihost::Value(deviceIDOf(index)));
+  path.addKey("SystemCreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
+  path.addKey("SystemName", cmpihost::Value(kSystemName));
+  return path;
+}
+
+cmpihost::ObjectPathValue capabilitiesPath() {
+  cmpihost::ObjectPathValue path(kNameSpace, "KESTA_BlueLightCapabilities");
+  path.addKey("InstanceID", cmpihost::Value("KESTA:BlueLightCapabilities1"));
+  return path;
+}
+
+// ---------------------------------------------------------------------------------------------
+// The log file of the "file" run
+// ---------------------------------------------------------------------------------------------
+
+std::string logFile() { return scratchDirectory() + "/provider.log"; }
+
+// The log would grow by megabytes per operation; it is cut back now and then. The logger appends,
+// so it simply carries on at the new end.
+void trimLog() {
+  if (options.sink != "file") return;
+  static unsigned calls = 0;
+  if (++calls % 16 != 0) return;
+  struct stat info = {};
+  if (::stat(logFile().c_str(), &info) == 0 && info.st_size > (64 << 20)) {
+    if (::truncate(logFile().c_str(), 0) != 0) std::perror("truncate");
+  }
+}
+
+// ---------------------------------------------------------------------------------------------
+// The operations
+// ---------------------------------------------------------------------------------------------
+
+using Operation = std::function<std::size_t()>;  // returns the number of objects handed over
+
+std::size_t handedOver(const cmpihost::Outcome& outcome) {
+  if (outcome.status.rc != CMPI_RC_OK) {
+    throw std::runtime_error("operation failed with rc " + std::to_string(outcome.status.rc));
+  }
+  return outcome.count(cmpihost::ResultKind::Instance) +
+         outcome.count(cmpihost::ResultKind::ObjectPath);
+}
+
+Operation enumerateInstances() {
+  return [] {
+    return handedOver(
+        cmpihost::enumerateInstances(provider->broker, provider->lights, lightClassPath()));
+  };
+}
+
+Operation enumerateInstanceNames() {
+  return [] {
+    return handedOver(
+        cmpihost::enumerateInstanceNames(provider->broker, provider->lights, lightClassPath()));
+  };
+}
+
+Operation getInstance(int count) {
+  const cmpihost::ObjectPathValue path = lightPath(count / 2);
+  return [path] {
+    return handedOver(cmpihost::getInstance(provider->broker, provider->lights, path));
+  };
+}
+
+Operation associators(CMPIAssociationMI* Provider::*mi, cmpihost::ObjectPathValue source,
+                      std::string association) {
+  return [mi, source, association] {
+    return handedOver(
+        cmpihost::associators(provider->broker, (*provider).*mi, source, association));
+  };
+}
+
+Operation references(CMPIAssociationMI* Provider::*mi, cmpihost::ObjectPathValue source,
+                     std::string association) {
+  return [mi, source, association] {
+    return handedOver(cmpihost::references(provider->broker, (*provider).*mi, source, association));
+  };
+}
+
+// The floor: the calls that any provider of N lights must make, served by the host. The texts
+// are made up front, as a provider that kept its data at hand would have them.
+struct FloorData {
+  std::vector<std::string> deviceIDs;
+  std::vector<CMPIUint16> healthStates;
+  std::vector<CMPIUint16> alarmStates;
+};
+
+FloorData floorData(int count) {
+  FloorData data;
+  for (int i = 0; i < count; ++i) {
+    data.deviceIDs.push_back(deviceIDOf(i));
+    data.healthStates.push_back(static_cast<CMPIUint16>(i % 2 == 0 ? 5 : 10));
+    data.alarmStates.push_back(static_cast<CMPIUint16>(1 + i % 3));
+  }
+  return data;
+}
+
+CMPIObjectPath* floorPath(const CMPIBroker* broker, const char* nameSpace,
+                          const std::string& deviceID) {
+  CMPIObjectPath* path = CMNewObjectPath(broker, nameSpace, "KESTA_BlueLight", nullptr);
+  CMSetHostname(path, kSystemName.c_str());
+  CMAddKey(path, "CreationClassName", "KESTA_BlueLight", CMPI_chars);
+  CMAddKey(path, "DeviceID", deviceID.c_str(), CMPI_chars);
+  CMAddKey(path, "SystemCreationClassName", "KESTA_ComputerSystem", CMPI_chars);
+  CMAddKey(path, "SystemName", kSystemName.c_str(), CMPI_chars);
+  return path;
+}
+
+Operation floorInstances(int count) {
+  auto data = std::make_shared<FloorData>(floorData(count));
+  return [data] {
+    const cmpihost::Outcome outcome =
+        cmpihost::run(provider->broker, [&](cmpihost::Request& request) {
+          const CMPIBroker* broker = provider->broker.cmpi();
+          for (std::size_t i = 0; i < data->deviceIDs.size(); ++i) {
+            const std::string& deviceID = data->deviceIDs[i];
+            // The instance takes its keys from its key properties, so its path needs none.
+            CMPIObjectPath* path =
+                CMNewObjectPath(broker, kNameSpace.c_str(), "KESTA_BlueLight", nullptr);
+            CMSetHostname(path, kSystemName.c_str());
+            CMPIInstance* instance = CMNewInstance(broker, path, nullptr);
+            CMSetProperty(instance, "CreationClassName", "KESTA_BlueLight", CMPI_chars);
+            CMSetProperty(instance, "DeviceID", deviceID.c_str(), CMPI_chars);
+            CMSetProperty(instance, "SystemCreationClassName", "KESTA_ComputerSystem", CMPI_chars);
+            CMSetProperty(instance, "SystemName", kSystemName.c_str(), CMPI_chars);
+            CMSetProperty(instance, "Caption", "Blue Light", CMPI_chars);
+            CMSetProperty(instance, "Description", "Blue Light", CMPI_chars);
+            CMSetProperty(instance, "Name", "Blue Light", CMPI_chars);
+            CMSetProperty(instance, "ElementName", "Blue Light", CMPI_chars);
+            CMPIUint16 requested = 2;
+            CMSetProperty(instance, "RequestedState", &requested, CMPI_uint16);
+            CMSetProperty(instance, "HealthState", &data->healthStates[i], CMPI_uint16);
+            CMPIArray* status = CMNewArray(broker, 2, CMPI_uint16, nullptr);
+            CMPIUint16 ok = 2;
+            CMPIUint16 inService = 11;
+            CMSetArrayElementAt(status, 0, &ok, CMPI_uint16);
+            CMSetArrayElementAt(status, 1, &inService, CMPI_uint16);
+            CMSetProperty(instance, "OperationalStatus", &status, CMPI_uint16A);
+            CMPIBoolean no = 0;
+            CMPIBoolean yes = 1;
+            CMSetProperty(instance, "AudibleAlarm", &no, CMPI_boolean);
+            CMSetProperty(instance, "VisibleAlarm", &yes, CMPI_boolean);
+            CMSetProperty(instance, "MotionAlarm", &no, CMPI_boolean);
+            CMSetProperty(instance, "AlarmState", &data->alarmStates[i], CMPI_uint16);
+            CMReturnInstance(request.result(), instance);
+          }
+          CMReturnDone(request.result());
+          return CMPIStatus{CMPI_RC_OK, nullptr};
+        });
+    return handedOver(outcome);
+  };
+}
+
+Operation floorNames(int count) {
+  auto data = std::make_shared<FloorData>(floorData(count));
+  return [data] {
+    const cmpihost::Outcome outcome =
+        cmpihost::run(provider->broker, [&](cmpihost::Request& request) {
+          const CMPIBroker* broker = provider->broker.cmpi();
+          for (const std::string& deviceID : data->deviceIDs) {
+            CMReturnObjectPath(request.result(), floorPath(broker, kNameSpace.c_str(), deviceID));
+          }
+          CMReturnDone(request.result());
+          return CMPIStatus{CMPI_RC_OK, nullptr};
+        });
+    return handedOver(outcome);
+  };
+}
+
+// The walk: what the platform costs to read the tree, the same way the provider reads it.
+Operation walk() {
+  return [] {
+    Kesta::Instrumentation cursor;
+    std::size_t lights = 0;
+    cursor.selectNode(Kesta::NodeLexicon::NODE_TYPE_BLUE_LIGHT);
+    while (cursor) {
+      std::string path = cursor.getPathToNode();
+      std::string description = cursor.getNodeDescription();
+      unsigned int status = cursor.getNodeStatus();
+      unsigned int alarmState = 0;
+      cursor.getProperty(Kesta::NodeLexicon::PROPERTY_ALARM_STATE, alarmState);
+      benchmark::DoNotOptimize(path);
+      benchmark::DoNotOptimize(description);
+      benchmark::DoNotOptimize(status);
+      benchmark::DoNotOptimize(alarmState);
+      ++lights;
+      ++cursor;
+    }
+    return lights;
+  };
+}
+
+// ---------------------------------------------------------------------------------------------
+// Running and recording
+// ---------------------------------------------------------------------------------------------
+
+struct Figures {
+  double nsPerOp = 0;
+  double allocationsPerOp = 0;
+  double peakBytesPerOp = 0;
+  int lights = 0;
+};
+
+std::map<std::string, Figures> figures;  // by benchmark name, e.g. "EnumerateInstances/4096"
+
+void registerOperation(const std::string& name, int count, Operation operation,
+                       std::size_t expected) {
+  benchmark::RegisterBenchmark(
+      (name + "/" + std::to_string(count)).c_str(),
+      [count, operation, expected, name](benchmark::State& state) {
+        useTree(count);
+        // One operation first: it checks the answer and warms the caches (catalogue, host).
+        const std::size_t got = operation();
+        if (got != expected) {
+          state.SkipWithError(
+              (name + " handed over " + std::to_string(got) + ", not " + std::to_string(expected))
+                  .c_str());
+          return;
+        }
+        trimLog();
+        // The heap of a few operations outside the timed loop: the highest of them counts.
+        bench::HeapCost heap;
+        for (int i = 0; i < 3; ++i) {
+          const bench::HeapCost one = bench::measureHeap(operation);
+          heap.allocations = one.allocations;
+          heap.peakAbove = std::max(heap.peakAbove, one.peakAbove);
+        }
+        for (auto _ : state) {
+          benchmark::DoNotOptimize(operation());
+          trimLog();
+        }
+        state.counters["lights"] = count;
+        state.counters["allocs"] = static_cast<double>(heap.allocations);
+        state.counters["peak_B"] = static_cast<double>(heap.peakAbove);
+        state.counters["ns_per_light"] =
+            benchmark::Counter(static_cast<double>(count) * static_cast<double>(state.iterations()),
+                               benchmark::Counter::kIsRate | benchmark::Counter::kInvert);
+      })
+      ->UseRealTime()
+      ->Unit(benchmark::kMicrosecond);
+}
+
+// Keeps the figures of each benchmark (the median when repetitions are asked for) while the
+// console shows them as usual.
+class CollectingReporter : public benchmark::ConsoleReporter {
+ public:
+  void ReportRuns(const std::vector<Run>& runs) override {
+    for (const Run& run : runs) {
+      if (run.error_occurred) continue;
+      const bool aggregate = run.run_type == Run::RT_Aggregate;
+      if (aggregate && run.aggregate_name != "median") continue;
+      // The name without the "/real_time" that UseRealTime() appends.
+      std::string name = run.run_name.str();
+      const std::string suffix = "/real_time";
+      if (name.size() > suffix.size() &&
+          name.compare(name.size() - suffix.size(), suffix.size(), suffix) == 0) {
+        name.erase(name.size() - suffix.size());
+      }
+      Figures& entry = figures[name];
+      if (!aggregate && medians_.count(name) != 0) continue;
+      if (aggregate) medians_.insert({name, true});
+      // Real time per iteration in nanoseconds, whatever unit the console shows.
+      entry.nsPerOp =
+          run.GetAdjustedRealTime() / benchmark::GetTimeUnitMultiplier(run.time_unit) * 1e9;
+      const auto counter = [&run](const char* key) {
+        const auto found = run.counters.find(key);
+        return found == run.counters.end() ? 0.0 : found->second.value;
+      };
+      entry.allocationsPerOp = counter("allocs");
+      entry.peakBytesPerOp = counter("peak_B");
+      entry.lights = static_cast<int>(counter("lights"));
+    }
+    ConsoleReporter::ReportRuns(runs);
+  }
+
+ private:
+  std::map<std::string, bool> medians_;
+};
+
+// Heap growth over many operations: after a warm-up, the heap in use must come back to where it
+// was, to the byte.
+long long heapGrowth(long operations) {
+  useTree(kAssociationLights);
+  const Operation operation = enumerateInstances();
+  for (int i = 0; i < 100; ++i) operation();
+  const std::int64_t before = bench::bytesInUse();
+  for (long i = 0; i < operations; ++i) operation();
+  return static_cast<long long>(bench::bytesInUse() - before);
+}
+
+int runChild() {
+  ::setenv("KESTA_SYSTEM_NAME", kSystemName.c_str(), 1);
+  ::setenv("KESTA_LANGUAGE", "en", 1);
+  if (options.sink == "file") {
+    ::setenv("VNLOG_SINK", ("file:" + logFile()).c_str(), 1);
+    ::setenv("VNLOG_LEVEL", "0", 1);
+  } else {
+    ::setenv("VNLOG_SINK", "none", 1);
+    ::unsetenv("VNLOG_LEVEL");
+  }
+  provider = std::make_unique<Provider>(options.library);
+
+  const std::string prefix = options.sink + ":";
+  for (const int count : kLightCounts) {
+    const auto n = static_cast<std::size_t>(count);
+    registerOperation(prefix + "EnumerateInstances", count, enumerateInstances(), n);
+    registerOperation(prefix + "EnumerateInstanceNames", count, enumerateInstanceNames(), n);
+    registerOperation(prefix + "GetInstance", count, getInstance(count), 1);
+    registerOperation(prefix + "Floor.Instances", count, floorInstances(count), n);
+    registerOperation(prefix + "Floor.Names", count, floorNames(count), n);
+    registerOperation(prefix + "Walk", count, walk(), n);
+  }
+  if (options.sink == "none") {
+    const auto n = static_cast<std::size_t>(kAssociationLights);
+    const std::string association = "KESTA_BlueLightElementCapabilities";
+    const std::string systemDevice = "KESTA_BlueLightSystemDevice";
+    registerOperation(prefix + "Associators.ElementCapabilities", kAssociationLights,
+                      associators(&Provider::elementCapabilities, capabilitiesPath(), association),
+                      n);
+    registerOperation(prefix + "References.ElementCapabilities", kAssociationLights,
+                      references(&Provider::elementCapabilities, capabilitiesPath(), association),
+                      n);
+    registerOperation(
+        prefix + "Associators.SystemDevice", kAssociationLights,
+        associators(&Provider::systemDevice, Provider::computerSystemPath(), systemDevice), n);
+    registerOperation(
+        prefix + "References.SystemDevice", kAssociationLights,
+        references(&Provider::systemDevice, Provider::computerSystemPath(), systemDevice), n);
+  }
+
+  std::vector<char*> arguments;
+  std::string program = "bluelight-bench";
+  arguments.push_back(program.data());
+  for (std::string& argument : options.benchmarkArgs) arguments.push_back(argument.data());
+  int argumentCount = static_cast<int>(arguments.size());
+  benchmark::Initialize(&argumentCount, arguments.data());
+  CollectingReporter reporter;
+  benchmark::RunSpecifiedBenchmarks(&reporter);
+
+  long long growth = 0;
+  std::size_t liveObjects = 0;
+  if (options.sink == "none" && options.growthOps > 0) {
+    growth = heapGrowth(options.growthOps);
+    liveObjects = provider->broker.liveObjectCount();
+  }
+
+  std::ofstream out(options.resultsFile);
+  out << std::setprecision(17);
+  for (const auto& [name, entry] : figures) {
+    out << "R\t" << name << "\t" << entry.nsPerOp << "\t" << entry.allocationsPerOp << "\t"
+        << entry.peakBytesPerOp << "\t" << entry.lights << "\n";
+  }
+  if (options.sink == "none") {
+    out << "G\t" << options.growthOps << "\t" << growth << "\t" << liveObjects << "\n";
+  }
+  provider.reset();
+  return out ? 0 : 1;
+}
+
+// ---------------------------------------------------------------------------------------------
+// The parent: runs the children and reports
+// ---------------------------------------------------------------------------------------------
+
+int runChildProcess(const std::string& sink, const std::string& resultsFile, char** argv) {
+  std::cout.flush();
+  const pid_t child = ::fork();
+  if (child < 0) throw std::runtime_error("fork failed");
+  if (child == 0) {
+    // The child's scratch files go below the parent's, which removes them all at the end.
+    ::setenv("TMPDIR", scratchDirectory().c_str(), 1);
+    std::vector<std::string> arguments = {
+        argv[0], "--bench-child=" + sink, "--bench-results=" + resultsFile,
+        "--bench-library=" + options.library,
+        "--bench-growth-ops=" + std::to_string(options.growthOps)};
+    for (const std::string& argument : options.benchmarkArgs) arguments.push_back(argument);
+    std::vector<char*> pointers;
+    for (std::string& argument : arguments) pointers.push_back(argument.data());
+    pointers.push_back(nullptr);
+    ::execv("/proc/self/exe", pointers.data());
+    std::perror("execv");
+    ::_exit(127);
+  }
+  int status = 0;
+  while (::waitpid(child, &status, 0) < 0) {
+  }
+  return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+}
+
+struct Results {
+  std::map<std::string, Figures> rows;  // by "<sink>:<name>/<N>"
+  long growthOps = -1;
+  long long growth = 0;
+  long long liveObjects = 0;
+
+  bool has(const std::string& key) const { return rows.count(key) != 0; }
+  double ns(const std::string& key) const { return rows.at(key).nsPerOp; }
+};
+
+void readResults(const std::string& file, Results& results) {
+  std::ifstream in(file);
+  std::string line;
+  while (std::getline(in, line)) {
+    std::istringstream fields(line);
+    std::string kind;
+    std::getline(fields, kind, '\t');
+    if (kind == "R") {
+      std::string name;
+      Figures entry;
+      std::getline(fields, name, '\t');
+      fields >> entry.nsPerOp >> entry.allocationsPerOp >> entry.peakBytesPerOp >> entry.lights;
+      results.rows[name] = entry;
+    } else if (kind == "G") {
+      fields >> results.growthOps >> results.growth >> results.liveObjects;
+    }
+  }
+}
+
+std::string fixed(double value, int decimals) {
+  std::ostringstream out;
+  out << std::fixed << std::setprecision(decimals) << value;
+  return out.str();
+}
+
+void printTable(const Results& results) {
+  std::cout << "\nFigures (median real time; allocations and peak heap of one operation)\n\n";
+  std::cout << std::left << std::setw(42) << "operation" << std::right << std::setw(6) << "N"
+            << std::setw(14) << "ns/op" << std::setw(10) << "ns/light" << std::setw(10) << "allocs"
+            << std::setw(12) << "peak B" << std::setw(9) << "B/light"
+            << "\n";
+  for (const std::string sink : {"none", "file"}) {
+    for (const auto& [key, entry] : results.rows) {
+      if (key.compare(0, sink.size() + 1, sink + ":") != 0) continue;
+      const std::string name = key.substr(0, key.rfind('/'));
+      const double lights = entry.lights > 0 ? entry.lights : 1;
+      std::cout << std::left << std::setw(42) << name << std::right << std::setw(6) << entry.lights
+                << std::setw(14) << fixed(entry.nsPerOp, 0) << std::setw(10)
+                << fixed(entry.nsPerOp / lights, 0) << std::setw(10)
+                << fixed(entry.allocationsPerOp, 0) << std::setw(12)
+                << fixed(entry.peakBytesPerOp, 0) << std::setw(9)
+                << fixed(entry.peakBytesPerOp / lights, 0) << "\n";
+    }
+  }
+}
+
+// One ratio against its target; missing figures count as a failure.
+struct Check {
+  std::string what;
+  double value = NAN;
+  double limit = 0;
+  std::string unit;
+  bool pass() const { return !std::isnan(value) && value <= limit; }
+};
+
+std::vector<Check> checks(const Results& r) {
+  std::vector<Check> list;
+  const auto ratio = [&r](const std::string& top, const std::vector<std::string>& bottom) {
+    if (!r.has(top)) return static_cast<double>(NAN);
+    double sum = 0;
+    for (const std::string& key : bottom) {
+      if (!r.has(key)) return static_cast<double>(NAN);
+      sum += r.ns(key);
+    }
+    return r.ns(top) / sum;
+  };
+  const auto perLight = [&r](const std::string& key) {
+    return r.has(key) ? r.ns(key) / r.rows.at(key).lights : static_cast<double>(NAN);
+  };
+  const auto scaling = [&](const std::string& name) {
+    return perLight(name + "/4096") / perLight(name + "/256");
+  };
+  list.push_back(
+      {"R = EnumerateInstances(4096, sink none) / (floor + walk)",
+       ratio("none:EnumerateInstances/4096", {"none:Floor.Instances/4096", "none:Walk/4096"}), 1.5,
+       ""});
+  list.push_back(
+      {"EnumerateInstances(4096, every line to a file) / (floor + walk)",
+       ratio("file:EnumerateInstances/4096", {"file:Floor.Instances/4096", "file:Walk/4096"}), 3.0,
+       ""});
+  list.push_back({"ns per light at 4096 / at 256, EnumerateInstances, sink none",
+                  scaling("none:EnumerateInstances"), 1.3, ""});
+  list.push_back({"ns per light at 4096 / at 256, EnumerateInstances, file",
+                  scaling("file:EnumerateInstances"), 1.3, ""});
+  // Peak heap O(N): the bytes per light may not grow with N.
+  const auto peakPerLight = [&r](const std::string& key) {
+    return r.has(key) ? r.rows.at(key).peakBytesPerOp / r.rows.at(key).lights
+                      : static_cast<double>(NAN);
+  };
+  list.push_back(
+      {"peak heap per light at 4096 / at 256, EnumerateInstances, sink none",
+       peakPerLight("none:EnumerateInstances/4096") / peakPerLight("none:EnumerateInstances/256"),
+       1.3, ""});
+  if (r.growthOps >= 0) {
+    list.push_back(
+        {"heap growth over " + std::to_string(r.growthOps) + " EnumerateInstances(256), bytes",
+         static_cast<double>(r.growth), 0, ""});
+    list.push_back({"broker objects alive after them", static_cast<double>(r.liveObjects), 0, ""});
+  }
+  return list;
+}
+
+void printInformativeRatios(const Results& r) {
+  std::cout << "\nEach operation against its floor plus walk (for information)\n\n";
+  for (const std::string sink : {"none", "file"}) {
+    for (const int count : kLightCounts) {
+      const std::string n = "/" + std::to_string(count);
+      const std::string walkKey = sink + ":Walk" + n;
+      const std::vector<std::pair<std::string, std::string>> pairs = {
+          {"EnumerateInstances", "Floor.Instances" + n},
+          {"EnumerateInstanceNames", "Floor.Names" + n},
+          {"GetInstance", "Floor.Instances/1"}};
+      for (const auto& [operation, floor] : pairs) {
+        const std::string key = sink + ":" + operation + n;
+        if (!r.has(key) || !r.has(walkKey) || !r.has(sink + ":" + floor)) continue;
+        std::cout << "  " << std::left << std::setw(40) << key << std::right
+                  << fixed(r.ns(key) / (r.ns(sink + ":" + floor) + r.ns(walkKey)), 2) << "\n";
+      }
+    }
+  }
+}
+
+int runParent(char** argv) {
+  Results results;
+  std::stringstream sinks(options.sinks);
+  std::string sink;
+  while (std::getline(sinks, sink, ',')) {
+    if (sink != "none" && sink != "file") {
+      std::cerr << "unknown sink \"" << sink << "\" (none or file)\n";
+      return 2;
+    }
+    const std::string resultsFile = scratchDirectory() + "/results-" + sink + ".txt";
+    std::cout << "=== log sink: " << (sink == "none" ? "none" : "file, VNLOG_LEVEL=0")
+              << " ===" << std::endl;
+    const int status = runChildProcess(sink, resultsFile, argv);
+    if (status != 0) {
+      std::cerr << "the benchmark run with sink " << sink << " failed (" << status << ")\n";
+      return 2;
+    }
+    readResults(resultsFile, results);
+  }
+  printTable(results);
+  printInformativeRatios(results);
+
+  std::cout << "\nTargets\n\n";
+  bool allPass = true;
+  for (const Check& check : checks(results)) {
+    if (std::isnan(check.value)) {
+      std::cout << "  n/a   " << check.what << " (not measured)\n";
+      continue;
+    }
+    allPass = allPass && check.pass();
+    std::cout << "  " << (check.pass() ? "PASS" : "FAIL") << "  " << std::left << std::setw(72)
+              << check.what << std::right << std::setw(10) << fixed(check.value, 2) << "  (at most "
+              << fixed(check.limit, 1) << ")\n";
+  }
+  std::cout << std::endl;
+  const char* strict = std::getenv("BENCH_STRICT");
+  if (!allPass && strict != nullptr && std::string(strict) == "1") return 1;
+  return 0;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  try {
+    options = parseOptions(argc, argv);
+    if (!options.sink.empty()) return runChild();
+    const int status = runParent(argv);
+    std::error_code ignored;
+    std::filesystem::remove_all(scratchDirectory(), ignored);
+    return status;
+  } catch (const std::exception& error) {
+    std::cerr << "bluelight-bench: " << error.what() << "\n";
+    return 2;
+  }
+}
