@@ -6,6 +6,7 @@
 
 #include "KestaCommon.h"
 #include "standalone/FileIo.h"
+#include "standalone/IpmiSource.h"
 #include "standalone/JsonFileSource.h"
 #include "standalone/SysfsLedSource.h"
 #include "standalone/Text.h"
@@ -55,7 +56,12 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
     return std::make_unique<SysfsLedSource>(rest.empty() ? std::string(kDefaultSysfsLedDirectory)
                                                          : std::string(rest));
   }
-  throw SourceError("unknown kind of source (expected file:<path> or sysfs:<directory>)");
+  if (colon != std::string_view::npos && (scheme == "ipmi" || scheme == "ipmi-lan")) {
+    return makeIpmiSource(text);
+  }
+  throw SourceError(
+      "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
+      "ipmi-lan:<host>?credentials=<file>)");
 }
 
 SourceSetting configuredSource() {

@@ -96,17 +96,19 @@ TEST_F(SourceSelection, AChangedVariableCountsFromTheNextCursor) {
 }
 
 TEST_F(SourceSelection, UnknownSchemeIsLoggedAndThrown) {
-  ScopedEnv source("KESTA_INSTRUMENTATION", "ipmi:bmc0");
+  ScopedEnv source("KESTA_INSTRUMENTATION", "http:bmc0");
   EXPECT_EQ(failureText(),
-            "Instrumentation source \"ipmi:bmc0\" (from KESTA_INSTRUMENTATION) cannot be read: "
-            "unknown kind of source (expected file:<path> or sysfs:<directory>)");
+            "Instrumentation source \"http:bmc0\" (from KESTA_INSTRUMENTATION) cannot be read: "
+            "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
+            "ipmi-lan:<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, TextWithoutSchemeIsLoggedAndThrown) {
   ScopedEnv source("KESTA_INSTRUMENTATION", "/var/lib/tree.json");
   EXPECT_EQ(failureText(),
             "Instrumentation source \"/var/lib/tree.json\" (from KESTA_INSTRUMENTATION) cannot be "
-            "read: unknown kind of source (expected file:<path> or sysfs:<directory>)");
+            "read: unknown kind of source (expected file:<path>, sysfs:<directory>, "
+            "ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, FileWithoutPathIsLoggedAndThrown) {
