@@ -231,6 +231,8 @@ class PathReader {
       if (atEnd()) fail("the quoted value of key " + key + " has no closing quote", start);
       const char c = text_[pos_++];
       if (c == '"') break;
+      // A C string ends at a NUL, so no CIM value can hold one (the same rule as for \x0).
+      if (c == '\0') fail("a NUL character cannot be part of a value", pos_ - 1);
       if (c != '\\') {
         text += c;
         continue;

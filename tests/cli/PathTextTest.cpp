@@ -187,6 +187,9 @@ TEST(PathText, MalformedPathsSayWhatIsWrongAndWhere) {
   EXPECT_EQ(pathError(R"(C.a="\x0")"),
             "malformed object path \"C.a=\\\"\\\\x0\\\"\": \\x0 (a NUL character) cannot be part "
             "of a value (character 6)");
+  EXPECT_EQ(pathError(std::string("C.a=\"x\0y\"", 9)),
+            "malformed object path \"C.a=\\\"x\\x0000y\\\"\": a NUL character cannot be part of "
+            "a value (character 7)");
   EXPECT_EQ(pathError("C.a=99999999999999999999999"),
             "malformed object path \"C.a=99999999999999999999999\": the value of key a, "
             "99999999999999999999999, is out of range (character 5)");
