@@ -51,8 +51,8 @@ class VNLogger {
  public:
   // One line at log level ("LOG").
   static void logLevelMessage(const char* function, const char* file, int line,
-                              const std::string& category, int level, char* reserved,
-                              int reserved1, int reserved2, const std::string& message);
+                              const std::string& category, int level, char* reserved, int reserved1,
+                              int reserved2, const std::string& message);
   // One line at trace level ("TRACE").
   static void traceLevelMessage(const char* function, const char* file, int line,
                                 const std::string& category, int level, char* reserved,

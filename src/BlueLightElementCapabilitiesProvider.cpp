@@ -124,8 +124,7 @@ int bluelightElementCapabilitiesCMPIInstances(const CMPIObjectPath* ref, const c
   return 0;
 }
 
-CMPIStatus BlueLightElementCapabilities_Cleanup(CMPIInstanceMI*, const CMPIContext*,
-                                                CMPIBoolean) {
+CMPIStatus BlueLightElementCapabilities_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
   return okStatus();
 }
 
@@ -280,9 +279,8 @@ CMPIStatus BlueLightElementCapabilities_ExecQuery(CMPIInstanceMI*, const CMPICon
 CMPIStatus BlueLightElementCapabilities_Associators(CMPIAssociationMI* mi, const CMPIContext* ctx,
                                                     const CMPIResult* result,
                                                     const CMPIObjectPath* ref,
-                                                    const char* assocClass,
-                                                    const char* resultClass, const char* role,
-                                                    const char* resultRole,
+                                                    const char* assocClass, const char* resultClass,
+                                                    const char* role, const char* resultRole,
                                                     const char** properties) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     std::ostream& stream = list << " mi=" << mi;
@@ -302,8 +300,8 @@ CMPIStatus BlueLightElementCapabilities_Associators(CMPIAssociationMI* mi, const
   // Object managers pass a null association class when the client named none; they only ask
   // the providers of associations that can apply, so the client meant this one.
   CMPIObjectPath* targetPath = factory.get_assoc_targetClass_ObjectPath(
-      mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass,
-      resultClass, &status);
+      mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass, resultClass,
+      &status);
   if (CMIsNullObject(targetPath)) {
     const char* const text = "Object Path is NULL in Associators.";
     reportFailure(mb, BlueLightElementCapabilitiesProvider, &status, text, text);
@@ -325,13 +323,10 @@ CMPIStatus BlueLightElementCapabilities_Associators(CMPIAssociationMI* mi, const
   return status;
 }
 
-CMPIStatus BlueLightElementCapabilities_AssociatorNames(CMPIAssociationMI* mi,
-                                                        const CMPIContext* ctx,
-                                                        const CMPIResult* result,
-                                                        const CMPIObjectPath* ref,
-                                                        const char* assocClass,
-                                                        const char* resultClass, const char* role,
-                                                        const char* resultRole) {
+CMPIStatus BlueLightElementCapabilities_AssociatorNames(
+    CMPIAssociationMI* mi, const CMPIContext* ctx, const CMPIResult* result,
+    const CMPIObjectPath* ref, const char* assocClass, const char* resultClass, const char* role,
+    const char* resultRole) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     std::ostream& stream = list << " mi=" << mi;
     stream << " ctx=" << ctx << " result=" << result << " ref=" << ref
@@ -348,8 +343,8 @@ CMPIStatus BlueLightElementCapabilities_AssociatorNames(CMPIAssociationMI* mi,
   paths.reserve(factory.getNumberOfInstances());
 
   CMPIObjectPath* targetPath = factory.get_assoc_targetClass_ObjectPath(
-      mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass,
-      resultClass, &status);
+      mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass, resultClass,
+      &status);
   if (CMIsNullObject(targetPath)) {
     // "AssociatorsNames" is the operation's own long-standing spelling.
     const char* const text = "Object Path is NULL in AssociatorsNames.";
@@ -393,8 +388,8 @@ bool returnReferences(const CMPIBroker* mb, const CMPIResult* result, const CMPI
   }
   const char* targetClass = classNameOf(targetPath, status);
 
-  CMPIObjectPath* assocPath = CMNewObjectPath(mb, nameSpaceCharsOf(ref, status),
-                                              BlueLightElementCapabilitiesClass, status);
+  CMPIObjectPath* assocPath =
+      CMNewObjectPath(mb, nameSpaceCharsOf(ref, status), BlueLightElementCapabilitiesClass, status);
   if (!CMIsNullObject(assocPath)) {
     CMSetNameSpace(assocPath, nameSpaceCharsOf(ref, status));
     CMSetHostname(assocPath, Kesta::getSystemName().c_str());
@@ -466,8 +461,7 @@ CMPIStatus BlueLightElementCapabilities_ReferenceNames(CMPIAssociationMI* mi,
                                                        const CMPIContext* ctx,
                                                        const CMPIResult* result,
                                                        const CMPIObjectPath* ref,
-                                                       const char* resultClass,
-                                                       const char* role) {
+                                                       const char* resultClass, const char* role) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     std::ostream& stream = list << " mi=" << mi;
     stream << " ctx=" << ctx << " result=" << result << " ref=" << ref

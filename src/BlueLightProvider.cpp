@@ -119,8 +119,7 @@ CMPIStatus BlueLight_GetInstance(CMPIInstanceMI* mi, const CMPIContext* ctx,
     BlueLightFactory factory(true, false);
     std::vector<CMPIInstance*> instances;
     instances.reserve(factory.getNumberOfInstances());
-    if (factory.getAllBlueLightCMPIInstances(mb, cop, properties, false, instances, &status) !=
-        0) {
+    if (factory.getAllBlueLightCMPIInstances(mb, cop, properties, false, instances, &status) != 0) {
       return status;
     }
     returnFirstMatching(result, cop, instances, false, &status);
@@ -154,18 +153,19 @@ CMPIStatus BlueLight_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIRe
 namespace {
 
 CMPIInstanceMIFT instMIFT__ = {
-    CMPICurrentVersion,          CMPICurrentVersion,        "instanceBlueLightProfileProvider",
-    BlueLight_Cleanup,           BlueLight_EnumInstanceNames, BlueLight_EnumInstances,
-    BlueLight_GetInstance,       BlueLight_CreateInstance,  BlueLight_ModifyInstance,
-    BlueLight_DeleteInstance,    BlueLight_ExecQuery,
+    CMPICurrentVersion,       CMPICurrentVersion,          "instanceBlueLightProfileProvider",
+    BlueLight_Cleanup,        BlueLight_EnumInstanceNames, BlueLight_EnumInstances,
+    BlueLight_GetInstance,    BlueLight_CreateInstance,    BlueLight_ModifyInstance,
+    BlueLight_DeleteInstance, BlueLight_ExecQuery,
 };
 
 }  // namespace
 }  // namespace BlueLightProvider
 }  // namespace Kesta
 
-CMPI_EXTERN_C CMPIInstanceMI* BlueLightProfileProvider_Create_InstanceMI(
-    const CMPIBroker* brkr, const CMPIContext* /*ctx*/, CMPIStatus* /*rc*/) {
+CMPI_EXTERN_C CMPIInstanceMI* BlueLightProfileProvider_Create_InstanceMI(const CMPIBroker* brkr,
+                                                                         const CMPIContext* /*ctx*/,
+                                                                         CMPIStatus* /*rc*/) {
   static CMPIInstanceMI mi = {nullptr, &Kesta::BlueLightProvider::instMIFT__};
   Kesta::BlueLightProvider::broker.store(brkr);
   return &mi;

@@ -181,8 +181,8 @@ CMPIStatus BlueLightSystemDevice_EnumInstanceNames(CMPIInstanceMI* mi, const CMP
         return status;
       }
       CMSetNameSpace(lightPath, nameSpaceCharsOf(ref, &status));
-      CMPIObjectPath* assocPath = CMNewObjectPath(mb, nameSpaceCharsOf(ref, &status),
-                                                  BlueLightSystemDeviceClass, &status);
+      CMPIObjectPath* assocPath =
+          CMNewObjectPath(mb, nameSpaceCharsOf(ref, &status), BlueLightSystemDeviceClass, &status);
       if (CMIsNullObject(assocPath)) {
         reportFailure(
             mb, component, &status,
@@ -282,10 +282,10 @@ namespace {
 // or, with `namesOnly`, as object paths. All calls use a status of their own, which becomes the
 // operation's status at the end and on the failure returns. A request this association does not
 // serve, or whose result class does not fit, ends silently with success.
-CMPIStatus associatedObjects(const CMPIBroker* mb, const CMPIContext* ctx,
-                             const CMPIResult* result, const CMPIObjectPath* ref,
-                             const char* assocClass, const char* resultClass,
-                             const char** properties, bool namesOnly, bool& traceExit) {
+CMPIStatus associatedObjects(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIResult* result,
+                             const CMPIObjectPath* ref, const char* assocClass,
+                             const char* resultClass, const char** properties, bool namesOnly,
+                             bool& traceExit) {
   CMPIStatus localStatus = okStatus();
   traceExit = false;
 
@@ -303,9 +303,9 @@ CMPIStatus associatedObjects(const CMPIBroker* mb, const CMPIContext* ctx,
       return okStatus();
     }
     // Every computer system of the namespace, as the broker gives them.
-    CMPIEnumeration* systems =
-        namesOnly ? CBEnumInstanceNames(mb, ctx, targetPath, &localStatus)
-                  : CBEnumInstances(mb, ctx, targetPath, nullptr, &localStatus);
+    CMPIEnumeration* systems = namesOnly
+                                   ? CBEnumInstanceNames(mb, ctx, targetPath, &localStatus)
+                                   : CBEnumInstances(mb, ctx, targetPath, nullptr, &localStatus);
     if (localStatus.rc != CMPI_RC_OK) {
       KESTA_TRACE(loggerBlueLightSystemDeviceProvider, kFailureTraceLevel, MESSAGE, kUpcallFailed);
       return localStatus;
@@ -355,8 +355,8 @@ bool returnReferences(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIRe
                       const CMPIObjectPath* ref, const char* noTargetText, bool namesOnly,
                       CMPIStatus* status) {
   BlueLightFactory factory(true, false);
-  CMPIObjectPath* targetPath =
-      factory.get_assoc_targetClass_ObjectPath(mb, ref, BlueLightSystemDeviceClass, nullptr, status);
+  CMPIObjectPath* targetPath = factory.get_assoc_targetClass_ObjectPath(
+      mb, ref, BlueLightSystemDeviceClass, nullptr, status);
   if (CMIsNullObject(targetPath)) {
     reportFailure(mb, BlueLightSystemDeviceProvider, status, noTargetText, noTargetText);
     return false;
@@ -436,9 +436,9 @@ CMPIStatus BlueLightSystemDevice_Associators(CMPIAssociationMI* mi, const CMPICo
 
 CMPIStatus BlueLightSystemDevice_AssociatorNames(CMPIAssociationMI* mi, const CMPIContext* ctx,
                                                  const CMPIResult* result,
-                                                 const CMPIObjectPath* ref,
-                                                 const char* assocClass, const char* resultClass,
-                                                 const char* role, const char* resultRole) {
+                                                 const CMPIObjectPath* ref, const char* assocClass,
+                                                 const char* resultClass, const char* role,
+                                                 const char* resultRole) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     std::ostream& stream = list << " mi=" << mi;
     stream << " ctx=" << ctx << " result=" << result << " ref=" << ref
@@ -490,8 +490,7 @@ CMPIStatus BlueLightSystemDevice_References(CMPIAssociationMI* mi, const CMPICon
 }
 
 CMPIStatus BlueLightSystemDevice_ReferenceNames(CMPIAssociationMI* mi, const CMPIContext* ctx,
-                                                const CMPIResult* result,
-                                                const CMPIObjectPath* ref,
+                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                 const char* resultClass, const char* role) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     std::ostream& stream = list << " mi=" << mi;

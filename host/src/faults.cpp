@@ -21,12 +21,12 @@ const std::vector<TableSlots>& objectTableSlots() {
       {"CMPIArrayFT", {"clone", "getSize", "getSimpleType", "getElementAt", "setElementAt"}},
       {"CMPIObjectPathFT",
        {"clone", "setNameSpace", "getNameSpace", "setHostname", "getHostname", "setClassName",
-        "getClassName", "addKey", "getKey", "getKeyAt", "getKeyCount",
-        "setNameSpaceFromObjectPath", "setHostAndNameSpaceFromObjectPath", "getClassQualifier",
-        "getPropertyQualifier", "getMethodQualifier", "getParameterQualifier", "toString"}},
+        "getClassName", "addKey", "getKey", "getKeyAt", "getKeyCount", "setNameSpaceFromObjectPath",
+        "setHostAndNameSpaceFromObjectPath", "getClassQualifier", "getPropertyQualifier",
+        "getMethodQualifier", "getParameterQualifier", "toString"}},
       {"CMPIInstanceFT",
-       {"clone", "getProperty", "getPropertyAt", "getPropertyCount", "setProperty",
-        "getObjectPath", "setPropertyFilter", "setObjectPath", "setPropertyWithOrigin"}},
+       {"clone", "getProperty", "getPropertyAt", "getPropertyCount", "setProperty", "getObjectPath",
+        "setPropertyFilter", "setObjectPath", "setPropertyWithOrigin"}},
       {"CMPIEnumerationFT", {"clone", "getNext", "hasNext", "toArray"}},
       {"CMPIResultFT",
        {"clone", "returnData", "returnInstance", "returnObjectPath", "returnDone", "returnError"}},
@@ -252,8 +252,7 @@ bool FaultInjector::onObjectCall(const char* table, const char* function) {
 
 FaultId FaultInjector::arm(const Fault& fault) {
   if (fault.kind == FaultKind::InvalidateHandle && !fault.objectFunction.valid()) {
-    throw std::invalid_argument("cmpihost: no object function " +
-                                fault.objectFunction.toString() +
+    throw std::invalid_argument("cmpihost: no object function " + fault.objectFunction.toString() +
                                 " can lose its object's handle");
   }
   std::lock_guard<std::mutex> lock(mutex_);

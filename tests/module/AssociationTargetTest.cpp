@@ -48,8 +48,8 @@ TEST_F(FactoryTest, DecisionTable) {
     log_.clear();
     broker_.clearRecords();
     CMPIStatus status = untouchedStatus();
-    const char* target = factory.get_assoc_targetClass_Name(mb(), ref(row.source),
-                                                            row.association, "Any", &status);
+    const char* target =
+        factory.get_assoc_targetClass_Name(mb(), ref(row.source), row.association, "Any", &status);
     const std::string what = std::string(row.source) + " / " + row.association;
     if (row.target == nullptr) {
       EXPECT_EQ(target, nullptr) << what;
@@ -83,10 +83,10 @@ TEST_F(FactoryTest, TargetNameIsTheSameConstantEveryTime) {
 TEST_F(FactoryTest, ResultClassNeverDecides) {
   BlueLightFactory factory;
   for (const char* right : {"KESTA_BlueLight", "Nonsense", "", static_cast<const char*>(nullptr)}) {
-    EXPECT_STREQ(factory.get_assoc_targetClass_Name(mb(), ref("KESTA_BlueLight"),
-                                                    "KESTA_BlueLightElementCapabilities", right,
-                                                    nullptr),
-                 "KESTA_BlueLightCapabilities");
+    EXPECT_STREQ(
+        factory.get_assoc_targetClass_Name(mb(), ref("KESTA_BlueLight"),
+                                           "KESTA_BlueLightElementCapabilities", right, nullptr),
+        "KESTA_BlueLightCapabilities");
   }
 }
 
@@ -94,23 +94,25 @@ TEST_F(FactoryTest, NullResultClassEndsTheTracedList) {
   BlueLightFactory factory;
   factory.get_assoc_targetClass_Name(mb(), ref("KESTA_BlueLight"),
                                      "KESTA_BlueLightElementCapabilities", nullptr, nullptr);
-  const std::string list = " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightElementCapabilities "
-                           "_RefRightClass=";
+  const std::string list =
+      " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightElementCapabilities "
+      "_RefRightClass=";
   EXPECT_EQ(factoryLog(), (Names{entering("get_assoc_targetClass_Name", list),
                                  exiting("get_assoc_targetClass_Name", list)}));
 }
 
 TEST_F(FactoryTest, NullAssociationClassMatchesNoRow) {
   BlueLightFactory factory;
-  for (const char* source : {"KESTA_BlueLight", "KESTA_ComputerSystem",
-                             "KESTA_BlueLightCapabilities", "Other"}) {
+  for (const char* source :
+       {"KESTA_BlueLight", "KESTA_ComputerSystem", "KESTA_BlueLightCapabilities", "Other"}) {
     log_.clear();
-    EXPECT_EQ(factory.get_assoc_targetClass_Name(mb(), ref(source), nullptr, "KESTA_BlueLight",
-                                                 nullptr),
-              nullptr)
+    EXPECT_EQ(
+        factory.get_assoc_targetClass_Name(mb(), ref(source), nullptr, "KESTA_BlueLight", nullptr),
+        nullptr)
         << source;
-    EXPECT_EQ(factoryLog(), (Names{entering("get_assoc_targetClass_Name",
-                                            " broker=PTR ref=PTR _RefLeftClass=")}));
+    EXPECT_EQ(
+        factoryLog(),
+        (Names{entering("get_assoc_targetClass_Name", " broker=PTR ref=PTR _RefLeftClass=")}));
   }
   EXPECT_TRUE(brokerTraces().empty());
 }
@@ -149,8 +151,9 @@ TEST_F(FactoryTest, TargetObjectPathOfAnUnservedPairIsNullWithExitLine) {
   EXPECT_EQ(factory.get_assoc_targetClass_ObjectPath(mb(), ref("CIM_ComputerSystem"),
                                                      "KESTA_BlueLightSystemDevice", "X", nullptr),
             nullptr);
-  const std::string list = " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightSystemDevice "
-                           "_RefRightClass=X rc=0";
+  const std::string list =
+      " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightSystemDevice "
+      "_RefRightClass=X rc=0";
   EXPECT_EQ(factoryLog(), (Names{entering("get_assoc_targetClass_ObjectPath", list),
                                  entering("get_assoc_targetClass_Name", list),
                                  exiting("get_assoc_targetClass_ObjectPath", list)}));
@@ -161,9 +164,8 @@ TEST_F(FactoryTest, TargetObjectPathForEveryServedRow) {
   BlueLightFactory factory;
   for (const Row& row : kRows) {
     if (row.target == nullptr) continue;
-    CMPIObjectPath* path = factory.get_assoc_targetClass_ObjectPath(mb(), ref(row.source),
-                                                                    row.association, nullptr,
-                                                                    nullptr);
+    CMPIObjectPath* path = factory.get_assoc_targetClass_ObjectPath(
+        mb(), ref(row.source), row.association, nullptr, nullptr);
     ASSERT_NE(path, nullptr) << row.source;
     EXPECT_EQ(snapshot(path).className(), row.target);
     EXPECT_TRUE(snapshot(path).keys().empty());
@@ -173,9 +175,8 @@ TEST_F(FactoryTest, TargetObjectPathForEveryServedRow) {
 TEST_F(FactoryTest, TargetObjectPathFailureIsTheBrokers) {
   BlueLightFactory factory;
   broker_.armFault(cmpihost::Fault::nullResult(cmpihost::CreatingFunction::NewObjectPath, 1));
-  EXPECT_EQ(factory.get_assoc_targetClass_ObjectPath(mb(), ref("KESTA_BlueLight"),
-                                                     "KESTA_BlueLightSystemDevice", nullptr,
-                                                     nullptr),
+  EXPECT_EQ(factory.get_assoc_targetClass_ObjectPath(
+                mb(), ref("KESTA_BlueLight"), "KESTA_BlueLightSystemDevice", nullptr, nullptr),
             nullptr);
   // The exit line is written on both outcomes.
   EXPECT_EQ(factoryLog().size(), 4u);

@@ -28,9 +28,9 @@ TEST(BlueLightRecord, OperationalStatusTable) {
     unsigned status;
     Status expected;
   };
-  const Row rows[] = {{1, {2, 11}}, {20, {3, 5}},  {21, {3}}, {25, {3}},  {26, {3}},
-                      {0, {0}},     {2, {0}},      {19, {0}}, {27, {0}},  {100, {0}},
-                      {0xFFFFFFFFu, {0}}};
+  const Row rows[] = {{1, {2, 11}}, {20, {3, 5}}, {21, {3}},         {25, {3}},
+                      {26, {3}},    {0, {0}},     {2, {0}},          {19, {0}},
+                      {27, {0}},    {100, {0}},   {0xFFFFFFFFu, {0}}};
   for (const Row& row : rows) {
     BlueLight light;
     EXPECT_TRUE(light.setOperationalStatus(row.status));
@@ -53,8 +53,8 @@ TEST(BlueLightRecord, HealthStateTable) {
     unsigned status;
     unsigned short expected;
   };
-  const Row rows[] = {{1, 5},   {20, 10}, {23, 10}, {26, 10},          {0, 0},
-                      {2, 0},   {19, 0},  {27, 0},  {0xFFFFFFFFu, 0}};
+  const Row rows[] = {{1, 5}, {20, 10}, {23, 10}, {26, 10},        {0, 0},
+                      {2, 0}, {19, 0},  {27, 0},  {0xFFFFFFFFu, 0}};
   for (const Row& row : rows) {
     BlueLight light;
     EXPECT_TRUE(light.setHealthState(row.status));

@@ -34,11 +34,10 @@ TEST_F(FactoryTest, CapabilitiesInstanceWithBothProperties) {
   EXPECT_EQ(value.path().host(), kSystemName);
   EXPECT_EQ(value.path().nameSpace(), kNameSpace);
   EXPECT_EQ(status.rc, CMPI_RC_OK);
-  EXPECT_EQ(factoryLog(),
-            (Names{entering("makeBlueLightCapabilitiesInstance",
-                            kMakeList + "0 IsObjPath=0 rc=PTR"),
-                   exiting("makeBlueLightCapabilitiesInstance",
-                           kMakeList + "0 IsObjPath=0 rc=PTR")}));
+  EXPECT_EQ(
+      factoryLog(),
+      (Names{entering("makeBlueLightCapabilitiesInstance", kMakeList + "0 IsObjPath=0 rc=PTR"),
+             exiting("makeBlueLightCapabilitiesInstance", kMakeList + "0 IsObjPath=0 rc=PTR")}));
 }
 
 TEST_F(FactoryTest, CapabilitiesPropertyListCases) {
@@ -88,11 +87,10 @@ TEST_F(FactoryTest, CapabilitiesArrayFailureKeepsTheKeyAndReportsBothTexts) {
             StatusValue(CMPI_RC_ERR_FAILED,
                         std::string("Creating array for Property                         "
                                     "RequestedAlarmStatesSupported failed.")));
-  EXPECT_EQ(brokerTraces(),
-            (std::vector<cmpihost::TraceRecord>{brokerTrace(
-                2, "BlueLightCapabilitiesProvider",
-                "Creating Array for Property                         "
-                "RequestedAlarmStatesSupported failed.")}));
+  EXPECT_EQ(brokerTraces(), (std::vector<cmpihost::TraceRecord>{
+                                brokerTrace(2, "BlueLightCapabilitiesProvider",
+                                            "Creating Array for Property                         "
+                                            "RequestedAlarmStatesSupported failed.")}));
   // Unlike the lights, the exit line follows.
   EXPECT_EQ(factoryLog().size(), 2u);
 }
@@ -125,24 +123,24 @@ TEST_F(FactoryTest, CapabilitiesInstanceWithoutHandleIsReturnedAsItIs) {
 TEST_F(FactoryTest, CapabilitiesInstanceFailuresGiveNull) {
   BlueLightFactory factory;
   broker_.armFault(Fault::nullResult(CreatingFunction::NewInstance, 1));
-  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(),
-                                                      nullptr, false, nullptr),
+  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(), nullptr,
+                                                      false, nullptr),
             nullptr);
   broker_.armFault(Fault::nullHandle(CreatingFunction::NewObjectPath, 1));
-  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(),
-                                                      nullptr, false, nullptr),
+  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(), nullptr,
+                                                      false, nullptr),
             nullptr);
   EXPECT_TRUE(brokerTraces().empty());
 }
 
 TEST_F(FactoryTest, CapabilitiesPathFailureLeavesTheBrokersStatus) {
   BlueLightFactory factory;
-  broker_.armFault(Fault::errorStatus(CreatingFunction::NewObjectPath, 1,
-                                      StatusValue(CMPI_RC_ERR_INVALID_NAMESPACE,
-                                                  std::string("no such namespace"))));
+  broker_.armFault(Fault::errorStatus(
+      CreatingFunction::NewObjectPath, 1,
+      StatusValue(CMPI_RC_ERR_INVALID_NAMESPACE, std::string("no such namespace"))));
   CMPIStatus status = untouchedStatus();
-  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(),
-                                                      nullptr, false, &status),
+  EXPECT_EQ(factory.makeBlueLightCapabilitiesInstance(mb(), ref(), BlueLightCapabilities(), nullptr,
+                                                      false, &status),
             nullptr);
   EXPECT_EQ(cmpihost::toStatusValue(status),
             StatusValue(CMPI_RC_ERR_INVALID_NAMESPACE, std::string("no such namespace")));
@@ -177,12 +175,11 @@ TEST_F(FactoryTest, GetOneCapabilitiesNeedsTheExactIdentifier) {
     std::vector<CMPIInstance*> instances;
     CMPIStatus status = untouchedStatus();
     EXPECT_EQ(factory.getOneBlueLightCapabilitiesCMPIInstance(mb(), ref(), text(key), nullptr,
-                                                             instances, &status),
+                                                              instances, &status),
               1)
         << key;
     EXPECT_TRUE(instances.empty());
-    EXPECT_EQ(factoryLog(),
-              (Names{entering("getOneBlueLightCapabilitiesCMPIInstance", kOneList)}));
+    EXPECT_EQ(factoryLog(), (Names{entering("getOneBlueLightCapabilitiesCMPIInstance", kOneList)}));
   }
 }
 
@@ -207,8 +204,8 @@ TEST_F(FactoryTest, GetOneCapabilitiesAlwaysBuildsTheFullInstance) {
             0);
   EXPECT_EQ(propertyNames(snapshot(instances[0])), kBoth);
   ASSERT_EQ(factory.getOneBlueLightCapabilitiesCMPIInstance(
-                mb(), ref(), text("KESTA:BlueLightCapabilities1"), properties(Names{}),
-                instances, nullptr),
+                mb(), ref(), text("KESTA:BlueLightCapabilities1"), properties(Names{}), instances,
+                nullptr),
             0);
   EXPECT_EQ(propertyNames(snapshot(instances[1])), kKeyOnly);
 }
@@ -217,8 +214,8 @@ TEST_F(FactoryTest, GetAllCapabilitiesOnAnEmptyMap) {
   BlueLightFactory factory(true, false);
   log_.clear();
   std::vector<CMPIInstance*> instances(1, nullptr);
-  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false,
-                                                             instances, nullptr),
+  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false, instances,
+                                                             nullptr),
             0);
   EXPECT_EQ(instances.size(), 1u);
   const std::string list = " broker=PTR ref=PTR properties=0 isObjPath=0 instances=PTR rc=0";
@@ -229,8 +226,8 @@ TEST_F(FactoryTest, GetAllCapabilitiesOnAnEmptyMap) {
 TEST_F(FactoryTest, GetAllCapabilitiesForObjectPathsCarriesTheKeyOnly) {
   BlueLightFactory factory(false, true);
   std::vector<CMPIInstance*> instances;
-  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, true,
-                                                             instances, nullptr),
+  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, true, instances,
+                                                             nullptr),
             0);
   ASSERT_EQ(instances.size(), 1u);
   EXPECT_EQ(propertyNames(snapshot(instances[0])), kKeyOnly);
@@ -243,8 +240,8 @@ TEST_F(FactoryTest, GetAllCapabilitiesAppendsANullInstance) {
   BlueLightFactory factory(false, true);
   broker_.armFault(Fault::nullResult(CreatingFunction::NewInstance, 1));
   std::vector<CMPIInstance*> instances;
-  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false,
-                                                             instances, nullptr),
+  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false, instances,
+                                                             nullptr),
             0);
   ASSERT_EQ(instances.size(), 1u);
   EXPECT_EQ(instances[0], nullptr);

@@ -212,11 +212,11 @@ TEST_F(CollectorTest, MissingSourceIsAFailureWithOneLogLine) {
 
 TEST_F(CollectorTest, MalformedSourcesAreFailures) {
   const std::vector<std::string> texts = {
-      "{\"nodes\": [",                                                     // truncated
-      "{\"nodes\": {}}",                                                   // not a list
-      "[]",                                                                // no object
+      "{\"nodes\": [",                                                               // truncated
+      "{\"nodes\": {}}",                                                             // not a list
+      "[]",                                                                          // no object
       "{\"nodes\": [{\"type\": \"26\", \"path\": \"1\", \"description\": \"x\"}]}",  // wrong type
-      "{\"nodes\": [{\"type\": 26, \"description\": \"x\"}]}",             // no path
+      "{\"nodes\": [{\"type\": 26, \"description\": \"x\"}]}",                       // no path
       "{\"nodes\": [{\"type\": 26, \"path\": \"1\", \"description\": \"\xff\xfe\"}]}",  // not UTF-8
       "{\"nodes\": [{\"type\": 26, \"path\": \"1\", \"description\": \"x\", \"status\": -1}]}",
   };

@@ -107,12 +107,12 @@ class FactoryTest : public ::testing::Test {
 
 // The traced parts of a record copy written the way the lines write them.
 inline std::string entering(const std::string& function, const std::string& list) {
-  return "ENTERING: " + function + "() in BlueLightObjFactory.cpp [Line: N],Parameters List: " +
-         list;
+  return "ENTERING: " + function +
+         "() in BlueLightObjFactory.cpp [Line: N],Parameters List: " + list;
 }
 inline std::string exiting(const std::string& function, const std::string& list) {
-  return "EXITING: " + function + "() in BlueLightObjFactory.cpp [Line: N],Parameters List: " +
-         list;
+  return "EXITING: " + function +
+         "() in BlueLightObjFactory.cpp [Line: N],Parameters List: " + list;
 }
 
 inline cmpihost::InstanceValue snapshot(const CMPIInstance* instance) {

@@ -22,8 +22,8 @@ TEST_F(FactoryTest, CollectsNothingWithoutFlags) {
   std::vector<CMPIInstance*> instances;
   EXPECT_EQ(factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status),
             0);
-  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false,
-                                                             instances, &status),
+  EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIInstances(mb(), ref(), nullptr, false, instances,
+                                                             &status),
             0);
   EXPECT_TRUE(instances.empty());
   EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);

@@ -12,11 +12,21 @@ using cmpihost::Value;
 using testsupport::blueLight;
 using Names = std::vector<std::string>;
 
-const Names kAllProperties = {"CreationClassName", "DeviceID",         "SystemCreationClassName",
-                              "SystemName",        "Caption",          "Description",
-                              "Name",              "ElementName",      "RequestedState",
-                              "HealthState",       "OperationalStatus", "AudibleAlarm",
-                              "VisibleAlarm",      "MotionAlarm",      "AlarmState"};
+const Names kAllProperties = {"CreationClassName",
+                              "DeviceID",
+                              "SystemCreationClassName",
+                              "SystemName",
+                              "Caption",
+                              "Description",
+                              "Name",
+                              "ElementName",
+                              "RequestedState",
+                              "HealthState",
+                              "OperationalStatus",
+                              "AudibleAlarm",
+                              "VisibleAlarm",
+                              "MotionAlarm",
+                              "AlarmState"};
 const Names kKeys = {"CreationClassName", "DeviceID", "SystemCreationClassName", "SystemName"};
 
 BlueLight record(const std::string& deviceID = "Blue Light:1.2") {
@@ -166,10 +176,10 @@ TEST_F(FactoryTest, ArrayFailureReturnsThePartlyBuiltInstance) {
   CMPIInstance* instance =
       factory.makeBlueLightInstance(mb(), ref(), record(), nullptr, false, &status);
   ASSERT_NE(instance, nullptr);
-  EXPECT_EQ(propertyNames(snapshot(instance)),
-            (Names{"CreationClassName", "DeviceID", "SystemCreationClassName", "SystemName",
-                   "Caption", "Description", "Name", "ElementName", "RequestedState",
-                   "HealthState"}));
+  EXPECT_EQ(
+      propertyNames(snapshot(instance)),
+      (Names{"CreationClassName", "DeviceID", "SystemCreationClassName", "SystemName", "Caption",
+             "Description", "Name", "ElementName", "RequestedState", "HealthState"}));
   EXPECT_EQ(cmpihost::toStatusValue(status),
             StatusValue(CMPI_RC_ERR_FAILED,
                         std::string("Create Array for Property                         "
@@ -179,8 +189,8 @@ TEST_F(FactoryTest, ArrayFailureReturnsThePartlyBuiltInstance) {
                 2, "BlueLightProfileProvider",
                 "Create Array for Property Operat                        ionalStatus failed.")}));
   // The exit line is left out after an array failure.
-  EXPECT_EQ(factoryLog(), (Names{entering("makeBlueLightInstance",
-                                          kMakeList + "0 isObjPath=0 rc=PTR")}));
+  EXPECT_EQ(factoryLog(),
+            (Names{entering("makeBlueLightInstance", kMakeList + "0 isObjPath=0 rc=PTR")}));
 }
 
 TEST_F(FactoryTest, ArrayFailureWithAPropertyListStopsAtOperationalStatus) {
@@ -216,9 +226,8 @@ TEST_F(FactoryTest, ObjectPathFailureGivesNullSilently) {
 
 TEST_F(FactoryTest, CaptionIsLocalised) {
   BlueLightFactory factory;
-  for (const auto& [language, caption] :
-       std::vector<std::pair<std::string, std::string>>{{"en", "Blue Light"},
-                                                        {"xx", "Blue Light"}}) {
+  for (const auto& [language, caption] : std::vector<std::pair<std::string, std::string>>{
+           {"en", "Blue Light"}, {"xx", "Blue Light"}}) {
     testsupport::ScopedEnv env("KESTA_LANGUAGE", language);
     const InstanceValue value = snapshot(factory.makeBlueLightInstance(
         mb(), ref(), record(), properties(Names{"Caption"}), false, nullptr));
@@ -305,8 +314,8 @@ TEST_F(FactoryTest, GetOneWithoutAKeyFindsNothing) {
   useTree({blueLight("1")});
   BlueLightFactory factory(true, false);
   std::vector<CMPIInstance*> instances;
-  EXPECT_EQ(
-      factory.getOneBlueLightCMPIInstance(mb(), ref(), nullptr, nullptr, instances, nullptr), 1);
+  EXPECT_EQ(factory.getOneBlueLightCMPIInstance(mb(), ref(), nullptr, nullptr, instances, nullptr),
+            1);
   CMPIString noHandle{nullptr, text("x")->ft};
   EXPECT_EQ(
       factory.getOneBlueLightCMPIInstance(mb(), ref(), &noHandle, nullptr, instances, nullptr), 1);
@@ -331,8 +340,8 @@ TEST_F(FactoryTest, GetAllInDeviceIDOrder) {
   log_.clear();
   std::vector<CMPIInstance*> instances;
   CMPIStatus status = untouchedStatus();
-  EXPECT_EQ(
-      factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status), 0);
+  EXPECT_EQ(factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status),
+            0);
   EXPECT_EQ(deviceIDs(instances), (Names{"Blue Light:1", "Blue Light:2", "Blue Light:3"}));
   const auto log = factoryLog();
   ASSERT_EQ(log.size(), 2u + 3u * 2u);
@@ -356,8 +365,8 @@ TEST_F(FactoryTest, GetAllOnNoLightsIsQuietSuccess) {
   log_.clear();
   std::vector<CMPIInstance*> instances;
   CMPIStatus status = untouchedStatus();
-  EXPECT_EQ(
-      factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status), 0);
+  EXPECT_EQ(factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status),
+            0);
   EXPECT_TRUE(instances.empty());
   EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
   EXPECT_EQ(factoryLog(), (Names{entering("getAllBlueLightCMPIInstances", kAllList),
@@ -372,8 +381,8 @@ TEST_F(FactoryTest, GetAllKeepsNullInstancesAndAFilledStatus) {
   broker_.armFault(Fault::nullResult(CreatingFunction::NewArray, 1));
   std::vector<CMPIInstance*> instances;
   CMPIStatus status = untouchedStatus();
-  EXPECT_EQ(
-      factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status), 0);
+  EXPECT_EQ(factory.getAllBlueLightCMPIInstances(mb(), ref(), nullptr, false, instances, &status),
+            0);
   ASSERT_EQ(instances.size(), 2u);
   EXPECT_EQ(instances[0], nullptr);
   ASSERT_NE(instances[1], nullptr);

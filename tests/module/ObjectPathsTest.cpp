@@ -32,11 +32,11 @@ TEST_F(FactoryTest, NoLightsGiveNoPathsAndAnInfoTrace) {
   EXPECT_TRUE(paths.empty());
   EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
   EXPECT_EQ(status.msg, nullptr);
-  EXPECT_EQ(factoryLog(), (std::vector<std::string>{entering("getAllBlueLightCMPIObjPaths",
-                                                             kPathsList)}));
+  EXPECT_EQ(factoryLog(),
+            (std::vector<std::string>{entering("getAllBlueLightCMPIObjPaths", kPathsList)}));
   EXPECT_EQ(factoryLog("TRACE"), factoryLog());
-  EXPECT_EQ(brokerTraces(), (std::vector<cmpihost::TraceRecord>{
-                                brokerTrace(1, "BlueLightProfileProvider", "***No instance found***")}));
+  EXPECT_EQ(brokerTraces(), (std::vector<cmpihost::TraceRecord>{brokerTrace(
+                                1, "BlueLightProfileProvider", "***No instance found***")}));
 }
 
 TEST_F(FactoryTest, NoCapabilitiesGiveNoPathsAndAWarningTrace) {
@@ -46,11 +46,11 @@ TEST_F(FactoryTest, NoCapabilitiesGiveNoPathsAndAWarningTrace) {
   EXPECT_EQ(factory.getAllBlueLightCapabilitiesCMPIObjPaths(mb(), ref(), paths, &status), 1);
   EXPECT_TRUE(paths.empty());
   EXPECT_EQ(status.rc, CMPI_RC_ERR_NOT_FOUND);
-  EXPECT_EQ(factoryLog(), (std::vector<std::string>{entering(
-                              "getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList)}));
-  EXPECT_EQ(brokerTraces(),
-            (std::vector<cmpihost::TraceRecord>{
-                brokerTrace(2, "BlueLightCapabilitiesProvider", "***No instance found***")}));
+  EXPECT_EQ(
+      factoryLog(),
+      (std::vector<std::string>{entering("getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList)}));
+  EXPECT_EQ(brokerTraces(), (std::vector<cmpihost::TraceRecord>{brokerTrace(
+                                2, "BlueLightCapabilitiesProvider", "***No instance found***")}));
 }
 
 TEST_F(FactoryTest, TwoLightsGiveTwoPathsInDeviceIDOrderWithFourKeys) {
@@ -76,9 +76,8 @@ TEST_F(FactoryTest, TheClassOfRefDoesNotMatterOnlyItsNamespace) {
   useTree({blueLight("1")});
   BlueLightFactory factory(true, true);
   std::vector<CMPIObjectPath*> paths;
-  ASSERT_EQ(factory.getAllBlueLightCMPIObjPaths(mb(), ref("Other_Class", "interop"), paths,
-                                                nullptr),
-            0);
+  ASSERT_EQ(
+      factory.getAllBlueLightCMPIObjPaths(mb(), ref("Other_Class", "interop"), paths, nullptr), 0);
   ASSERT_EQ(paths.size(), 1u);
   EXPECT_EQ(snapshot(paths[0]), lightPath("Blue Light:1", "interop"));
 }
@@ -108,8 +107,8 @@ TEST_F(FactoryTest, PathFailureOnTheSecondLight) {
                 2, "BlueLightProfileProvider",
                 "Create CMPIObjectPath                     failed for RecordLogClass.")}));
   // No exit line after a failure.
-  EXPECT_EQ(factoryLog(), (std::vector<std::string>{entering("getAllBlueLightCMPIObjPaths",
-                                                             kPathsList)}));
+  EXPECT_EQ(factoryLog(),
+            (std::vector<std::string>{entering("getAllBlueLightCMPIObjPaths", kPathsList)}));
 }
 
 TEST_F(FactoryTest, PathWithoutHandleIsAFailureToo) {
@@ -130,9 +129,9 @@ TEST_F(FactoryTest, PathFailureWithNullStatusStillTracesAndFails) {
   std::vector<CMPIObjectPath*> paths;
   EXPECT_EQ(factory.getAllBlueLightCMPIObjPaths(mb(), ref(), paths, nullptr), 2);
   EXPECT_EQ(brokerTraces().size(), 1u);
-  EXPECT_EQ(factoryLog(), (std::vector<std::string>{
-                              entering("getAllBlueLightCMPIObjPaths",
-                                       " broker=PTR ref=PTR objectPaths=PTR status=0")}));
+  EXPECT_EQ(factoryLog(),
+            (std::vector<std::string>{entering("getAllBlueLightCMPIObjPaths",
+                                               " broker=PTR ref=PTR objectPaths=PTR status=0")}));
   // No status text was made for nobody to read.
   for (const auto& call : broker_.calls()) EXPECT_NE(call.function, "newString");
 }
@@ -159,10 +158,9 @@ TEST_F(FactoryTest, CapabilitiesPathHasOneKeyAndTheHost) {
   expected.setHost(kSystemName);
   expected.addKey("InstanceID", Value("KESTA:BlueLightCapabilities1"));
   EXPECT_EQ(snapshot(paths[0]), expected);
-  EXPECT_EQ(factoryLog(),
-            (std::vector<std::string>{
-                entering("getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList),
-                exiting("getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList)}));
+  EXPECT_EQ(factoryLog(), (std::vector<std::string>{
+                              entering("getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList),
+                              exiting("getAllBlueLightCapabilitiesCMPIObjPaths", kPathsList)}));
 }
 
 TEST_F(FactoryTest, CapabilitiesPathFailureHasItsOwnTexts) {
@@ -190,7 +188,8 @@ TEST_F(FactoryTest, SystemNameIsReadForTheHostAndAgainForTheKey) {
   // The broker saw the name as the host and as the SystemName key.
   std::vector<std::string> seen;
   for (const auto& call : broker_.calls()) {
-    if (call.function == "setHostname" || call.function == "addKey") seen.push_back(call.toString());
+    if (call.function == "setHostname" || call.function == "addKey")
+      seen.push_back(call.toString());
   }
   ASSERT_EQ(seen.size(), 5u);
   EXPECT_NE(seen[0].find(kSystemName), std::string::npos) << seen[0];

@@ -24,7 +24,8 @@ TEST(Trace, EnteringLineNamesFunctionFileAndLine) {
 
 TEST(Trace, EveryTypeHasItsFormat) {
   EXPECT_STREQ(Kesta::trace("F.cpp", "fn", 1, EXITING), "EXITING: fn() in F.cpp [Line: 1]");
-  EXPECT_STREQ(Kesta::trace("F.cpp", "fn", 2, METHOD), "METHOD: fn() was invoked in F.cpp [Line: 2]");
+  EXPECT_STREQ(Kesta::trace("F.cpp", "fn", 2, METHOD),
+               "METHOD: fn() was invoked in F.cpp [Line: 2]");
   EXPECT_STREQ(Kesta::trace("F.cpp", "Something happened.", 3, MESSAGE),
                "MESSAGE [File: F.cpp, Line: 3]: Something happened.");
 }
@@ -96,7 +97,8 @@ TEST(Trace, PointerInserterWritesTheAddressLikeAStream) {
   int value = 0;
   int* pointer = &value;
   std::ostringstream expected;
-  expected << " p=" << static_cast<const void*>(pointer) << " n=" << static_cast<const void*>(nullptr);
+  expected << " p=" << static_cast<const void*>(pointer)
+           << " n=" << static_cast<const void*>(nullptr);
   buffer << " p=" << pointer << " n=" << static_cast<int*>(nullptr);
   EXPECT_EQ(VNLog::VNMessageBuffer::str(buffer), expected.str());
 }
@@ -105,7 +107,8 @@ TEST(Trace, NullTextInAListStopsTheList) {
   VNLog::VNMessageBuffer buffer;
   const char* missing = nullptr;
   std::ostream& stream = buffer << " a=" << static_cast<int*>(nullptr);
-  stream << " b=" << missing << " c=" << "text";
+  stream << " b=" << missing << " c="
+         << "text";
   EXPECT_EQ(VNLog::VNMessageBuffer::str(buffer), " a=0 b=");
   // The buffer is usable again afterwards.
   buffer << " d=1";
