@@ -44,34 +44,15 @@ std::string mofValue(const Value& value) {
     }
     return text + "}";
   }
+  // Only embedded instances and char16 are written differently in MOF than in a key of an
+  // object path; every other value is written the same way in both.
   switch (value.type()) {
-    case CMPI_string:
-    case CMPI_dateTime:
-      return quote(value.asString());
-    case CMPI_ref:
-      return quote(formatPath(value.asReference()));
     case CMPI_instance:
       return quote(inlineInstance(value.asInstance()));
-    case CMPI_boolean:
-      return value.asBoolean() ? "TRUE" : "FALSE";
     case CMPI_char16:
       return charLiteral(value.asUnsigned());
-    case CMPI_uint8:
-    case CMPI_uint16:
-    case CMPI_uint32:
-    case CMPI_uint64:
-      return std::to_string(value.asUnsigned());
-    case CMPI_sint8:
-    case CMPI_sint16:
-    case CMPI_sint32:
-    case CMPI_sint64:
-      return std::to_string(value.asSigned());
-    case CMPI_real32:
-      return realText(value.asReal(), true);
-    case CMPI_real64:
-      return realText(value.asReal(), false);
     default:
-      return value.toString();
+      return formatKeyValue(value);
   }
 }
 
