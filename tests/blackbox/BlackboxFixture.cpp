@@ -109,6 +109,72 @@ std::vector<std::string> BlackboxTest::traces(const cmpihost::Outcome& outcome) 
   return texts;
 }
 
+std::vector<std::string> BlackboxTest::logAtBothLevels(const std::string& category) const {
+  std::vector<std::string> logged = log(category, "LOG");
+  EXPECT_EQ(log(category, "TRACE"), logged) << category;
+  return logged;
+}
+
+void BlackboxTest::forEveryCreatingFault(
+    const std::vector<std::function<cmpihost::Outcome()>>& operations,
+    const std::function<void(const cmpihost::Outcome&)>& check) {
+  using cmpihost::Fault;
+  for (std::size_t op = 0; op < operations.size(); ++op) {
+    broker_.clearFaults();
+    broker_.resetCreationCounts();
+    operations[op]();
+    const cmpihost::CreationCounts counts = broker_.creationCounts();
+    for (cmpihost::CreatingFunction function : cmpihost::allCreatingFunctions()) {
+      for (std::uint64_t nth = 1; nth <= counts[function]; ++nth) {
+        for (const Fault& fault :
+             {Fault::nullResult(function, nth), Fault::nullHandle(function, nth),
+              Fault::errorStatus(function, nth)}) {
+          SCOPED_TRACE("operation " + std::to_string(op) + ", " +
+                       ::testing::PrintToString(fault.kind) + " on " +
+                       ::testing::PrintToString(function) + " #" + std::to_string(nth));
+          broker_.clearFaults();
+          broker_.armFault(fault);
+          check(operations[op]());
+        }
+      }
+    }
+  }
+  broker_.clearFaults();
+}
+
+std::vector<std::string> handOverKinds(const cmpihost::Outcome& outcome) {
+  std::vector<std::string> texts;
+  for (const cmpihost::ResultEvent& event : outcome.results) {
+    texts.push_back(std::string(cmpihost::toString(event.kind)) + " " +
+                    cmpihost::toString(event.state));
+  }
+  return texts;
+}
+
+std::vector<std::string> propertyTexts(const cmpihost::InstanceValue& instance) {
+  std::vector<std::string> texts;
+  for (const cmpihost::Property& property : instance.properties()) {
+    texts.push_back(property.name + " = " + property.value.toString());
+  }
+  return texts;
+}
+
+std::string callText(const cmpihost::CallRecord& call) {
+  std::string text = call.table + "." + call.function + "(";
+  for (std::size_t i = 0; i < call.args.size(); ++i) {
+    text += (i == 0 ? "" : ", ") + call.args[i];
+  }
+  return text + ")";
+}
+
+std::vector<std::string> callTexts(const cmpihost::Outcome& outcome, const std::string& function) {
+  std::vector<std::string> texts;
+  for (const cmpihost::CallRecord& call : outcome.calls) {
+    if (call.function == function) texts.push_back(callText(call));
+  }
+  return texts;
+}
+
 std::string entering(const std::string& function, const std::string& file,
                      const std::string& list) {
   return "ENTERING: " + function + "() in " + file + " [Line: N],Parameters List: " + list;

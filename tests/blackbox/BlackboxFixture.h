@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <memory>
 #include <optional>
 #include <string>
@@ -66,6 +67,16 @@ class BlackboxTest : public ::testing::Test {
   // The broker traces of an operation, each as "<level> <component>: <text>".
   static std::vector<std::string> traces(const cmpihost::Outcome& outcome);
 
+  // The lines of a category, which must have reached the log level and the trace level alike;
+  // returned once, as logged.
+  std::vector<std::string> logAtBothLevels(const std::string& category) const;
+
+  // Runs each operation once without faults to count its creating broker calls, then again with
+  // each of those calls failing in turn (null result, null handle, error status), and hands
+  // every faulted outcome to `check`.
+  void forEveryCreatingFault(const std::vector<std::function<cmpihost::Outcome()>>& operations,
+                             const std::function<void(const cmpihost::Outcome&)>& check);
+
   testsupport::TempDir dir_;
   std::string tree_ = dir_.file("tree.json");
   testsupport::ScopedEnv systemName_;
@@ -77,6 +88,15 @@ class BlackboxTest : public ::testing::Test {
 // The entry or exit line of an operation as the tests compare it.
 std::string entering(const std::string& function, const std::string& file, const std::string& list);
 std::string exiting(const std::string& function, const std::string& file, const std::string& list);
+
+// What an operation handed over, each as "<kind> <state>", e.g. "Instance Valid".
+std::vector<std::string> handOverKinds(const cmpihost::Outcome& outcome);
+// The properties of an instance as "Name = value", in the order they were set.
+std::vector<std::string> propertyTexts(const cmpihost::InstanceValue& instance);
+// A recorded call as "Table.function(args)", without the request it was made in.
+std::string callText(const cmpihost::CallRecord& call);
+// The recorded calls of one function, as callText() writes them.
+std::vector<std::string> callTexts(const cmpihost::Outcome& outcome, const std::string& function);
 
 }  // namespace blackbox
 

@@ -56,41 +56,19 @@ const std::string kPathTraceText =
     "2 BlueLightCapabilitiesProvider: Create CMPIObjectPath failed for                     "
     "BlueLightCapabilities class";
 
-Texts events(const Outcome& outcome) {
-  Texts texts;
-  for (const cmpihost::ResultEvent& event : outcome.results) {
-    texts.push_back(std::string(cmpihost::toString(event.kind)) + " " +
-                    cmpihost::toString(event.state));
-  }
-  return texts;
-}
-
-// The properties of an instance as "Name = value", in the order they were set.
-Texts describe(const InstanceValue& instance) {
-  Texts texts;
-  for (const cmpihost::Property& property : instance.properties()) {
-    texts.push_back(property.name + " = " + property.value.toString());
-  }
-  return texts;
-}
-
 class CapabilitiesProviderTest : public BlackboxTest {
  protected:
   CMPIInstanceMI* mi() { return instanceMI(kCapabilitiesProvider); }
 
   // The provider's own lines, which must reach the log level and the trace level alike.
   Texts providerLog() const {
-    Texts logged = log(kProviderCategory, "LOG");
-    EXPECT_EQ(log(kProviderCategory, "TRACE"), logged);
+    Texts logged = logAtBothLevels(kProviderCategory);
     for (const testsupport::LogLine& line : logLines()) {
       EXPECT_EQ(line.level, 3000) << line;
     }
     return logged;
   }
-  Texts factoryLog() const {
-    EXPECT_EQ(log(kFactoryCategory, "TRACE"), log(kFactoryCategory, "LOG"));
-    return log(kFactoryCategory, "LOG");
-  }
+  Texts factoryLog() const { return logAtBothLevels(kFactoryCategory); }
 
   static ObjectPathValue pathWithKey(const std::string& name, const Value& value) {
     ObjectPathValue path(kNameSpace, kClass);
@@ -106,7 +84,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstanceNamesReturnsTheOneRecordsPath) {
   const Outcome outcome = cmpihost::enumerateInstanceNames(broker_, mi(), classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"ObjectPath Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"ObjectPath Valid", "Done Valid"}));
   ASSERT_EQ(outcome.paths().size(), 1u);
   EXPECT_EQ(outcome.paths()[0].toString(),
             "//bbhost.example/root/cimv2:KESTA_BlueLightCapabilities.InstanceID=\"KESTA:"
@@ -172,7 +150,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstanceNamesSkipsAPathThatLostItsHandleSil
   const Outcome outcome = cmpihost::enumerateInstanceNames(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(),
             (Texts{entering("BlueLightCapabilities_EnumInstanceNames", kFile, kNamesList),
@@ -186,7 +164,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstanceNamesHandsOverAPathThatLosesItsHand
   const Outcome outcome = cmpihost::enumerateInstanceNames(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"ObjectPath NullHandle", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"ObjectPath NullHandle", "Done Valid"}));
 }
 
 // ---- EnumerateInstances ---------------------------------------------------------------------
@@ -196,9 +174,9 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesReturnsTheRecordWithItsAlarmStates
   const Outcome outcome = cmpihost::enumerateInstances(broker_, mi(), classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kFullRecord);
   EXPECT_EQ(outcome.instances()[0].path().className(), kClass);
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(),
@@ -215,18 +193,18 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesReturnsTheRecordWithItsAlarmStates
 TEST_F(CapabilitiesProviderTest, EnumInstancesIsTheSameWithoutAnyLight) {
   const Outcome outcome = cmpihost::enumerateInstances(broker_, mi(), classPath(kClass));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kFullRecord);
   // Asked twice, the alarm states do not grow.
   const Outcome again = cmpihost::enumerateInstances(broker_, mi(), classPath(kClass));
   ASSERT_EQ(again.instances().size(), 1u);
-  EXPECT_EQ(describe(again.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(again.instances()[0]), kFullRecord);
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesWithTheArrayListedSetsBothProperties) {
   const Outcome outcome = cmpihost::enumerateInstances(broker_, mi(), classPath(kClass),
                                                        Texts{"RequestedAlarmStatesSupported"});
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kFullRecord);
   const std::string list = " mi=PTR ctx=PTR result=PTR ref=PTR properties=PTR";
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_EnumInstances", kFile, list),
                                   exiting("BlueLightCapabilities_EnumInstances", kFile, list)}));
@@ -238,14 +216,14 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesWithAListWithoutTheArraySetsTheKey
   const Outcome outcome =
       cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass), Texts{"ElementName"});
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kKeyOnly);
   EXPECT_EQ(broker_.creationCounts()[CreatingFunction::NewArray], 0u);
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesWithAnEmptyListSetsTheKeyOnly) {
   const Outcome outcome = cmpihost::enumerateInstances(broker_, mi(), classPath(kClass), Texts{});
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kKeyOnly);
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesComparesPropertyNamesCaseSensitively) {
@@ -254,7 +232,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesComparesPropertyNamesCaseSensitive
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass),
                                                        Texts{"requestedalarmstatessupported"});
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kKeyOnly);
   // Not set at all, rather than set and dropped by the broker's filter.
   EXPECT_EQ(broker_.creationCounts()[CreatingFunction::NewArray], 0u);
 }
@@ -267,9 +245,9 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesArrayFailureReturnsTheKeyOnlyInsta
   // "array" in the status, "Array" in the trace.
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kArrayStatusText));
   EXPECT_EQ(traces(outcome), (Texts{kArrayTraceText}));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kKeyOnly);
   EXPECT_EQ(providerLog(),
             (Texts{entering("BlueLightCapabilities_EnumInstances", kFile, kEnumList),
                    exiting("BlueLightCapabilities_EnumInstances", kFile, kEnumList)}));
@@ -299,7 +277,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesArrayFailureWithoutAMessageString)
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED));
   EXPECT_EQ(traces(outcome), (Texts{kArrayTraceText}));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverNullWhenThePathCannotBeMade) {
@@ -308,7 +286,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverNullWhenThePathCannotBeMa
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(),
             (Texts{entering("BlueLightCapabilities_EnumInstances", kFile, kEnumList),
@@ -323,7 +301,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesReturnsTheBrokersStatusOfAFailedPa
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_ACCESS_DENIED, std::string("denied")));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverNullWhenTheInstanceCannotBeMade) {
@@ -332,7 +310,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverNullWhenTheInstanceCannot
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesPassesNoStatusToTheInstanceCreation) {
@@ -342,7 +320,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesPassesNoStatusToTheInstanceCreatio
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
 }
 
 TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverAnInstanceWithoutHandleAsItIs) {
@@ -351,7 +329,7 @@ TEST_F(CapabilitiesProviderTest, EnumInstancesHandsOverAnInstanceWithoutHandleAs
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullHandle", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullHandle", "Done Valid"}));
   // Nothing was set on it.
   for (const cmpihost::CallRecord& call : outcome.calls) {
     EXPECT_NE(call.function, "setProperty") << call;
@@ -366,9 +344,9 @@ TEST_F(CapabilitiesProviderTest, GetInstanceOfTheRecordReturnsIt) {
   const Outcome outcome = cmpihost::getInstance(broker_, mi(), capabilitiesPath());
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kFullRecord);
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_GetInstance", kFile, kGetList),
                                   exiting("BlueLightCapabilities_GetInstance", kFile, kGetList)}));
@@ -408,7 +386,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceWithoutKeysFails) {
 
   EXPECT_EQ(outcome.status,
             StatusValue(CMPI_RC_ERR_FAILED, std::string("At least one key should be passed")));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(traces(outcome),
             (Texts{"2 BlueLightCapabilitiesProvider: At least one key should be passed"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_GetInstance", kFile, kGetList),
@@ -424,7 +402,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceWithoutKeysHasNoMessageWhenTheString
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, classPath(kClass));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(traces(outcome),
             (Texts{"2 BlueLightCapabilitiesProvider: At least one key should be passed"}));
 }
@@ -438,7 +416,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceWithoutInstanceIDCollectsTheLightsAn
   EXPECT_EQ(outcome.status,
             StatusValue(CMPI_RC_ERR_NOT_FOUND,
                         std::string("CMPIObjectPathFT.getKey: no key named InstanceID")));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_GetInstance", kFile, kGetList),
                                   exiting("BlueLightCapabilities_GetInstance", kFile, kGetList)}));
@@ -455,7 +433,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceTreatsAnInstanceIDOfAnotherTypeAsMis
       cmpihost::getInstance(broker_, mi(), pathWithKey("InstanceID", Value::uint16(1)));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(log(kCollectorCategory).size(), 2u);
   EXPECT_EQ(factoryLog(),
             (Texts{entering("getAllBlueLightCapabilitiesCMPIInstances", kFactoryFile, kAllList),
@@ -467,7 +445,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceTreatsANullInstanceIDAsMissing) {
       cmpihost::getInstance(broker_, mi(), pathWithKey("InstanceID", Value::null(CMPI_string)));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(factoryLog().front(),
             entering("getAllBlueLightCapabilitiesCMPIInstances", kFactoryFile, kAllList));
 }
@@ -485,7 +463,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceFallbackFindsNothingEvenForTheRecord
   });
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_NOT_FOUND));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_GetInstance", kFile, kGetList),
                                   exiting("BlueLightCapabilities_GetInstance", kFile, kGetList)}));
 }
@@ -494,16 +472,16 @@ TEST_F(CapabilitiesProviderTest, GetInstanceWithAListWithoutTheArraySetsTheKeyOn
   const Outcome withOther =
       cmpihost::getInstance(broker_, mi(), capabilitiesPath(), Texts{"ElementName"});
   ASSERT_EQ(withOther.instances().size(), 1u);
-  EXPECT_EQ(describe(withOther.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(withOther.instances()[0]), kKeyOnly);
 
   const Outcome empty = cmpihost::getInstance(broker_, mi(), capabilitiesPath(), Texts{});
   ASSERT_EQ(empty.instances().size(), 1u);
-  EXPECT_EQ(describe(empty.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(empty.instances()[0]), kKeyOnly);
 
   const Outcome listed = cmpihost::getInstance(broker_, mi(), capabilitiesPath(),
                                                Texts{"RequestedAlarmStatesSupported"});
   ASSERT_EQ(listed.instances().size(), 1u);
-  EXPECT_EQ(describe(listed.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(listed.instances()[0]), kFullRecord);
 }
 
 TEST_F(CapabilitiesProviderTest, GetInstanceHandsOverNullWhenTheInstanceCannotBeMade) {
@@ -512,7 +490,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceHandsOverNullWhenTheInstanceCannotBe
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, capabilitiesPath());
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLightCapabilities_GetInstance", kFile, kGetList),
                                   exiting("BlueLightCapabilities_GetInstance", kFile, kGetList)}));
 }
@@ -523,7 +501,7 @@ TEST_F(CapabilitiesProviderTest, GetInstanceHandsOverAnInstanceWithoutHandleAsIt
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, capabilitiesPath());
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullHandle", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullHandle", "Done Valid"}));
 }
 
 TEST_F(CapabilitiesProviderTest, GetInstanceArrayFailureReturnsTheKeyOnlyInstance) {
@@ -533,9 +511,9 @@ TEST_F(CapabilitiesProviderTest, GetInstanceArrayFailureReturnsTheKeyOnlyInstanc
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kArrayStatusText));
   EXPECT_EQ(traces(outcome), (Texts{kArrayTraceText}));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]), kKeyOnly);
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]), kKeyOnly);
 }
 
 TEST_F(CapabilitiesProviderTest, TheRecordIsServedWhenTheLightsCannotBeRead) {
@@ -544,7 +522,7 @@ TEST_F(CapabilitiesProviderTest, TheRecordIsServedWhenTheLightsCannotBeRead) {
   EXPECT_EQ(names.paths().size(), 1u);
   const Outcome got = cmpihost::getInstance(broker_, mi(), capabilitiesPath());
   ASSERT_EQ(got.instances().size(), 1u);
-  EXPECT_EQ(describe(got.instances()[0]), kFullRecord);
+  EXPECT_EQ(propertyTexts(got.instances()[0]), kFullRecord);
 }
 
 }  // namespace

@@ -45,15 +45,6 @@ const std::vector<Exported> kAssociationMIs = {
      "KESTA_BlueLightSystemDevice"},
 };
 
-Texts events(const Outcome& outcome) {
-  Texts texts;
-  for (const cmpihost::ResultEvent& event : outcome.results) {
-    texts.push_back(std::string(cmpihost::toString(event.kind)) + " " +
-                    cmpihost::toString(event.state));
-  }
-  return texts;
-}
-
 // A status that no operation would leave behind, to see whether a factory touches its rc.
 CMPIStatus sentinelStatus() {
   return CMPIStatus{CMPI_RC_ERR_METHOD_NOT_AVAILABLE, reinterpret_cast<CMPIString*>(0x5a5a)};
@@ -396,7 +387,7 @@ TEST_F(FrameTest, AnEmptySuccessfulResultGivesOneDoneAndBothLines) {
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.status.message, std::nullopt);
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   const std::string list = " mi=PTR ctx=PTR result=PTR ref=PTR properties=0";
   EXPECT_EQ(log("Varnel.BlueLightProvider"),
             (Texts{entering("BlueLight_EnumInstances", "BlueLightProvider.cpp", list),
@@ -407,7 +398,7 @@ TEST_F(FrameTest, HandOverComesInFactoryOrderAndDoneComesLast) {
   useTree({blueLight("1.3"), blueLight("1.1"), blueLight("1.2")});
   const Outcome outcome = cmpihost::enumerateInstances(broker_, instanceMI(kLightProvider),
                                                        classPath("KESTA_BlueLight"));
-  EXPECT_EQ(events(outcome),
+  EXPECT_EQ(handOverKinds(outcome),
             (Texts{"Instance Valid", "Instance Valid", "Instance Valid", "Done Valid"}));
   Texts ids;
   for (const InstanceValue& instance : outcome.instances()) {

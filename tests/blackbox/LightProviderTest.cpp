@@ -69,28 +69,9 @@ const std::string kPathTraceText =
     "2 BlueLightProfileProvider: Create CMPIObjectPath                     failed for "
     "RecordLogClass.";
 
-// Every hand-over of an operation as "<kind> <state>", in order.
-Texts events(const Outcome& outcome) {
-  Texts texts;
-  for (const cmpihost::ResultEvent& event : outcome.results) {
-    texts.push_back(std::string(cmpihost::toString(event.kind)) + " " +
-                    cmpihost::toString(event.state));
-  }
-  return texts;
-}
-
 Texts names(const InstanceValue& instance) {
   Texts texts;
   for (const cmpihost::Property& property : instance.properties()) texts.push_back(property.name);
-  return texts;
-}
-
-// The properties of an instance as "Name = value", in the order they were set.
-Texts describe(const InstanceValue& instance) {
-  Texts texts;
-  for (const cmpihost::Property& property : instance.properties()) {
-    texts.push_back(property.name + " = " + property.value.toString());
-  }
   return texts;
 }
 
@@ -133,17 +114,13 @@ class LightProviderTest : public BlackboxTest {
   // The provider's own lines, which must reach the log level and the trace level alike, each at
   // level 3000.
   Texts providerLog() const {
-    Texts logged = log(kProviderCategory, "LOG");
-    EXPECT_EQ(log(kProviderCategory, "TRACE"), logged);
+    Texts logged = logAtBothLevels(kProviderCategory);
     for (const testsupport::LogLine& line : logLines()) {
       EXPECT_EQ(line.level, 3000) << line;
     }
     return logged;
   }
-  Texts factoryLog() const {
-    EXPECT_EQ(log(kFactoryCategory, "TRACE"), log(kFactoryCategory, "LOG"));
-    return log(kFactoryCategory, "LOG");
-  }
+  Texts factoryLog() const { return logAtBothLevels(kFactoryCategory); }
 
   // Two lights, reported out of DeviceID order.
   void useTwoLights() { useTree({blueLight("1.2"), blueLight("1.1")}); }
@@ -166,7 +143,7 @@ TEST_F(LightProviderTest, EnumInstanceNamesReturnsOnePathPerLightInDeviceIDOrder
       cmpihost::enumerateInstanceNames(broker_, mi(), classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome),
+  EXPECT_EQ(handOverKinds(outcome),
             (Texts{"ObjectPath Valid", "ObjectPath Valid", "ObjectPath Valid", "Done Valid"}));
   Texts paths;
   for (const ObjectPathValue& path : outcome.paths()) paths.push_back(path.toString());
@@ -288,7 +265,7 @@ TEST_F(LightProviderTest, EnumInstanceNamesHandsOverAPathThatLostItsHandle) {
       cmpihost::enumerateInstanceNames(broker_, instanceMi, classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"ObjectPath NullHandle", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"ObjectPath NullHandle", "Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_EnumInstanceNames", kFile, kNamesList),
                                   exiting("BlueLight_EnumInstanceNames", kFile, kNamesList)}));
 }
@@ -305,15 +282,19 @@ TEST_F(LightProviderTest, EnumInstancesReturnsLightsInDifferentStatesInDeviceIDO
   EXPECT_EQ(outcome.doneCount, 1u);
   ASSERT_EQ(outcome.instances().size(), 6u);
   // Byte-wise order: the blank of the padded description sorts before the colon.
-  EXPECT_EQ(describe(outcome.instances()[0]), lightProperties("Blue Light  :1.6", "0", "{0}", "0"));
-  EXPECT_EQ(describe(outcome.instances()[1]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]),
+            lightProperties("Blue Light  :1.6", "0", "{0}", "0"));
+  EXPECT_EQ(propertyTexts(outcome.instances()[1]),
             lightProperties("Blue Light:1.1", "10", "{3, 5}", "3"));
-  EXPECT_EQ(describe(outcome.instances()[2]), lightProperties("Blue Light:1.2", "0", "{}", "0"));
-  EXPECT_EQ(describe(outcome.instances()[3]), lightProperties("Blue Light:1.3", "10", "{3}", "1"));
-  EXPECT_EQ(describe(outcome.instances()[4]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[2]),
+            lightProperties("Blue Light:1.2", "0", "{}", "0"));
+  EXPECT_EQ(propertyTexts(outcome.instances()[3]),
+            lightProperties("Blue Light:1.3", "10", "{3}", "1"));
+  EXPECT_EQ(propertyTexts(outcome.instances()[4]),
             lightProperties("Blue Light:1.4", "5", "{2, 11}", "2"));
-  EXPECT_EQ(describe(outcome.instances()[5]), lightProperties("Blue Light:1.5", "0", "{0}", "0"));
-  EXPECT_EQ(events(outcome).back(), "Done Valid");
+  EXPECT_EQ(propertyTexts(outcome.instances()[5]),
+            lightProperties("Blue Light:1.5", "0", "{0}", "0"));
+  EXPECT_EQ(handOverKinds(outcome).back(), "Done Valid");
   EXPECT_TRUE(traces(outcome).empty());
 
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_EnumInstances", kFile, kEnumList),
@@ -331,7 +312,7 @@ TEST_F(LightProviderTest, EnumInstancesWithoutLightsCallsDoneOnceWithBothLines) 
   const Outcome outcome = cmpihost::enumerateInstances(broker_, mi(), classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   // Unlike the name enumeration, no "***No instance found***" trace.
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_EnumInstances", kFile, kEnumList),
@@ -384,7 +365,7 @@ TEST_F(LightProviderTest, EnumInstancesWithOperationalStatusListed) {
                                                        Texts{"OperationalStatus"});
 
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]),
             (Texts{"CreationClassName = \"KESTA_BlueLight\"", "DeviceID = \"Blue Light:1.1\"",
                    "SystemCreationClassName = \"KESTA_ComputerSystem\"",
                    "SystemName = \"bbhost.example\"", "OperationalStatus = {3, 5}"}));
@@ -399,7 +380,7 @@ TEST_F(LightProviderTest, EnumInstancesArrayFailureHandsOverThePartlyBuiltInstan
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kArrayStatusText));
   EXPECT_EQ(traces(outcome), (Texts{kArrayTraceText}));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
   EXPECT_EQ(names(outcome.instances()[0]), take(kAllNames, 10));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_EnumInstances", kFile, kEnumList),
@@ -458,7 +439,7 @@ TEST_F(LightProviderTest, EnumInstancesHandsOverNullWhenThePathCannotBeMade) {
       cmpihost::enumerateInstances(broker_, instanceMi, classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(factoryLog(), (Texts{entering("getAllBlueLightCMPIInstances", kFactoryFile, kAllList),
                                  entering("makeBlueLightInstance", kFactoryFile, kMakeList),
@@ -474,14 +455,14 @@ TEST_F(LightProviderTest, EnumInstancesPassesNoStatusToThePathOrInstanceCreation
   const Outcome noPath =
       cmpihost::enumerateInstances(broker_, instanceMi, classPath("KESTA_BlueLight"));
   EXPECT_EQ(noPath.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(noPath), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(noPath), (Texts{"Instance NullPointer", "Done Valid"}));
 
   broker_.clearFaults();
   broker_.armFault(Fault::errorStatus(CreatingFunction::NewInstance, 1, denied));
   const Outcome noInstance =
       cmpihost::enumerateInstances(broker_, instanceMi, classPath("KESTA_BlueLight"));
   EXPECT_EQ(noInstance.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(noInstance), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(noInstance), (Texts{"Instance NullPointer", "Done Valid"}));
 }
 
 TEST_F(LightProviderTest, EnumInstancesHandsOverNullForAnInstanceWithoutHandle) {
@@ -492,7 +473,7 @@ TEST_F(LightProviderTest, EnumInstancesHandsOverNullForAnInstanceWithoutHandle) 
       cmpihost::enumerateInstances(broker_, instanceMi, classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
 }
 
 TEST_F(LightProviderTest, EnumInstancesKeepsTheOtherLightsWhenOneInstanceCannotBeMade) {
@@ -503,7 +484,8 @@ TEST_F(LightProviderTest, EnumInstancesKeepsTheOtherLightsWhenOneInstanceCannotB
       cmpihost::enumerateInstances(broker_, instanceMi, classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome),
+            (Texts{"Instance Valid", "Instance NullPointer", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
   EXPECT_EQ(*outcome.instances()[0].find("DeviceID"), Value("Blue Light:1.1"));
 }
@@ -515,9 +497,9 @@ TEST_F(LightProviderTest, GetInstanceOfAKnownDeviceIDReturnsThatLight) {
   const Outcome outcome = cmpihost::getInstance(broker_, mi(), lightPath("Blue Light:1.2"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]),
             lightProperties("Blue Light:1.2", "10", "{3, 5}", "3"));
   EXPECT_TRUE(traces(outcome).empty());
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
@@ -560,7 +542,7 @@ TEST_F(LightProviderTest, GetInstanceFindsAPaddedLightByItsStrippedDeviceIDOnly)
   EXPECT_TRUE(unstripped.results.empty());
 
   const Outcome stripped = cmpihost::getInstance(broker_, mi(), lightPath("Blue Light:1.1"));
-  EXPECT_EQ(events(stripped), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(stripped), (Texts{"Instance Valid", "Done Valid"}));
 }
 
 TEST_F(LightProviderTest, GetInstanceWithoutKeysFailsWithoutReadingTheInstrumentation) {
@@ -569,7 +551,7 @@ TEST_F(LightProviderTest, GetInstanceWithoutKeysFailsWithoutReadingTheInstrument
 
   EXPECT_EQ(outcome.status,
             StatusValue(CMPI_RC_ERR_FAILED, std::string("At least one key should be passed")));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(traces(outcome),
             (Texts{"2 BlueLightProfileProvider: At least one key should be passed"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
@@ -584,7 +566,7 @@ TEST_F(LightProviderTest, GetInstanceWithoutKeysHasNoMessageWhenTheStringCannotB
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, classPath("KESTA_BlueLight"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(traces(outcome),
             (Texts{"2 BlueLightProfileProvider: At least one key should be passed"}));
 }
@@ -597,7 +579,7 @@ TEST_F(LightProviderTest, GetInstanceWithKeysButNoDeviceIDComparesWholePathsAndF
 
   // The later calls of the walk leave CMPI_RC_OK behind.
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
                                   exiting("BlueLight_GetInstance", kFile, kGetList)}));
   const Texts factory = factoryLog();
@@ -617,7 +599,7 @@ TEST_F(LightProviderTest, GetInstanceWithoutDeviceIDAndWithoutLightsKeepsTheStat
   EXPECT_EQ(outcome.status,
             StatusValue(CMPI_RC_ERR_NOT_FOUND,
                         std::string("CMPIObjectPathFT.getKey: no key named DeviceID")));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
                                   exiting("BlueLight_GetInstance", kFile, kGetList)}));
 }
@@ -629,7 +611,7 @@ TEST_F(LightProviderTest, GetInstanceTreatsADeviceIDOfAnotherTypeAsMissing) {
   const Outcome outcome = cmpihost::getInstance(broker_, mi(), cop);
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   const Texts factory = factoryLog();
   ASSERT_FALSE(factory.empty());
   EXPECT_EQ(factory.front(), entering("getAllBlueLightCMPIInstances", kFactoryFile, kAllList));
@@ -642,7 +624,7 @@ TEST_F(LightProviderTest, GetInstanceTreatsANullDeviceIDAsMissing) {
   const Outcome outcome = cmpihost::getInstance(broker_, mi(), cop);
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
   const Texts factory = factoryLog();
   ASSERT_FALSE(factory.empty());
   EXPECT_EQ(factory.front(), entering("getAllBlueLightCMPIInstances", kFactoryFile, kAllList));
@@ -660,9 +642,9 @@ TEST_F(LightProviderTest, GetInstanceWithoutUsableDeviceIDReturnsTheLightWhosePa
   const Outcome outcome = getWithExactKeyLookup(cop);
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance Valid", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance Valid", "Done Valid"}));
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]),
             lightProperties("Blue Light:1.2", "5", "{2, 11}", "2"));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
                                   exiting("BlueLight_GetInstance", kFile, kGetList)}));
@@ -684,7 +666,7 @@ TEST_F(LightProviderTest, GetInstanceWithoutUsableDeviceIDSkipsLightsWithoutInst
   });
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
 }
 
 TEST_F(LightProviderTest, GetInstanceWithoutDeviceIDReturnsTheStatusOfTheLastPathLookup) {
@@ -697,7 +679,7 @@ TEST_F(LightProviderTest, GetInstanceWithoutDeviceIDReturnsTheStatusOfTheLastPat
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, cop);
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_ACCESS_DENIED, std::string("no path")));
-  EXPECT_EQ(events(outcome), (Texts{"Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Done Valid"}));
 }
 
 TEST_F(LightProviderTest, GetInstanceSetsOnlyTheKeysAndTheListedProperties) {
@@ -706,7 +688,7 @@ TEST_F(LightProviderTest, GetInstanceSetsOnlyTheKeysAndTheListedProperties) {
                                                 Texts{"HealthState", "healthstate"});
 
   ASSERT_EQ(outcome.instances().size(), 1u);
-  EXPECT_EQ(describe(outcome.instances()[0]),
+  EXPECT_EQ(propertyTexts(outcome.instances()[0]),
             (Texts{"CreationClassName = \"KESTA_BlueLight\"", "DeviceID = \"Blue Light:1.1\"",
                    "SystemCreationClassName = \"KESTA_ComputerSystem\"",
                    "SystemName = \"bbhost.example\"", "HealthState = 10"}));
@@ -722,7 +704,7 @@ TEST_F(LightProviderTest, GetInstanceHandsOverNullWhenTheInstanceCannotBeMade) {
   const Outcome outcome = cmpihost::getInstance(broker_, instanceMi, lightPath("Blue Light:1.1"));
 
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
-  EXPECT_EQ(events(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
+  EXPECT_EQ(handOverKinds(outcome), (Texts{"Instance NullPointer", "Done Valid"}));
   EXPECT_EQ(providerLog(), (Texts{entering("BlueLight_GetInstance", kFile, kGetList),
                                   exiting("BlueLight_GetInstance", kFile, kGetList)}));
 }

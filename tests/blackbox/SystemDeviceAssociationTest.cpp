@@ -9,6 +9,8 @@
 
 namespace {
 
+using blackbox::callText;
+using blackbox::callTexts;
 using blackbox::entering;
 using blackbox::exiting;
 using cmpihost::CreatingFunction;
@@ -108,24 +110,6 @@ std::vector<std::string> namesOf(const std::vector<InstanceValue>& instances) {
 std::string pairOf(const Value* group, const Value* part) {
   return (group != nullptr ? nameOf(group->asReference()) : std::string("(none)")) + " -> " +
          (part != nullptr ? nameOf(part->asReference()) : std::string("(none)"));
-}
-
-// A recorded call as "Table.function(args)", without the request it was made in.
-std::string callText(const cmpihost::CallRecord& call) {
-  std::string text = call.table + "." + call.function + "(";
-  for (std::size_t i = 0; i < call.args.size(); ++i) {
-    text += (i == 0 ? "" : ", ") + call.args[i];
-  }
-  return text + ")";
-}
-
-// The recorded calls of one function, as callText() writes them.
-std::vector<std::string> callsOf(const Outcome& outcome, const std::string& function) {
-  std::vector<std::string> texts;
-  for (const cmpihost::CallRecord& call : outcome.calls) {
-    if (call.function == function) texts.push_back(callText(call));
-  }
-  return texts;
 }
 
 // What was handed over, without the request it was handed over in.
@@ -228,7 +212,7 @@ TEST_F(SystemDeviceAssociationTest, AssociatorsFromALightGiveEveryComputerSystem
   EXPECT_EQ(outcome.results.size(), 2u);
   EXPECT_EQ(outcome.doneCount, 0u);
   // Asked with the target path: the request's namespace, this host, no keys, no property list.
-  EXPECT_EQ(callsOf(outcome, "enumerateInstances"),
+  EXPECT_EQ(callTexts(outcome, "enumerateInstances"),
             std::vector<std::string>{"CMPIBrokerFT.enumerateInstances(context, "
                                      "//bbhost.example/root/cimv2:KESTA_ComputerSystem, NULL)"});
   EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToSystemsTrace}));
@@ -496,7 +480,7 @@ TEST_F(SystemDeviceAssociationTest, AssociatorNamesFromALightGiveEveryComputerSy
   EXPECT_EQ(outcome.paths(),
             (std::vector<ObjectPathValue>{computerSystemPath("cs1"), computerSystemPath("cs2")}));
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(callsOf(outcome, "enumerateInstanceNames"),
+  EXPECT_EQ(callTexts(outcome, "enumerateInstanceNames"),
             std::vector<std::string>{"CMPIBrokerFT.enumerateInstanceNames(context, "
                                      "//bbhost.example/root/cimv2:KESTA_ComputerSystem)"});
   const std::string list = associatorNamesList(kAssocClass, std::string("CIM_ComputerSystem"),
@@ -665,7 +649,7 @@ TEST_F(SystemDeviceAssociationTest, ReferencesFromALightGiveOneAssociationPerCom
   EXPECT_EQ(pairs, (std::vector<std::string>{"cs1 -> " + kLight1, "cs2 -> " + kLight1}));
   EXPECT_EQ(outcome.doneCount, 0u);
   EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToSystemsTrace}));
-  EXPECT_EQ(callsOf(outcome, "enumerateInstanceNames"),
+  EXPECT_EQ(callTexts(outcome, "enumerateInstanceNames"),
             std::vector<std::string>{"CMPIBrokerFT.enumerateInstanceNames(context, "
                                      "//bbhost.example/root/cimv2:KESTA_ComputerSystem)"});
   EXPECT_EQ(
@@ -874,27 +858,8 @@ TEST_F(SystemDeviceAssociationTest, EveryCreatingCallMayFail) {
       [&] { return references(computerSystemPath("cs1")); },
       [&] { return referenceNames(light()); },
       [&] { return referenceNames(computerSystemPath("cs1")); }};
-  for (std::size_t op = 0; op < operations.size(); ++op) {
-    broker_.clearFaults();
-    broker_.resetCreationCounts();
-    operations[op]();
-    const cmpihost::CreationCounts counts = broker_.creationCounts();
-    for (CreatingFunction function : cmpihost::allCreatingFunctions()) {
-      for (std::uint64_t nth = 1; nth <= counts[function]; ++nth) {
-        for (const Fault& fault :
-             {Fault::nullResult(function, nth), Fault::nullHandle(function, nth),
-              Fault::errorStatus(function, nth)}) {
-          SCOPED_TRACE("operation " + std::to_string(op) + ", " +
-                       ::testing::PrintToString(fault.kind) + " on " +
-                       ::testing::PrintToString(function) + " #" + std::to_string(nth));
-          broker_.clearFaults();
-          broker_.armFault(fault);
-          const Outcome outcome = operations[op]();
-          EXPECT_EQ(outcome.doneCount, 0u);
-        }
-      }
-    }
-  }
+  forEveryCreatingFault(operations,
+                        [](const Outcome& outcome) { EXPECT_EQ(outcome.doneCount, 0u); });
 }
 
 }  // namespace

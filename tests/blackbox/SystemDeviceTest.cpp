@@ -9,6 +9,8 @@
 
 namespace {
 
+using blackbox::callText;
+using blackbox::callTexts;
 using blackbox::entering;
 using blackbox::exiting;
 using cmpihost::CreatingFunction;
@@ -85,15 +87,6 @@ std::vector<std::string> pairsOf(const std::vector<InstanceValue>& instances) {
   return pairs;
 }
 
-// A recorded call as "Table.function(args)", without the request it was made in.
-std::string callText(const cmpihost::CallRecord& call) {
-  std::string text = call.table + "." + call.function + "(";
-  for (std::size_t i = 0; i < call.args.size(); ++i) {
-    text += (i == 0 ? "" : ", ") + call.args[i];
-  }
-  return text + ")";
-}
-
 // The position (1-based) of the call of `function` whose text is `text`, counting only calls of
 // that function; 0 when there is none. Used to aim a fault at one call site.
 std::uint64_t nthCall(const Outcome& outcome, const std::string& function, const std::string& text,
@@ -105,15 +98,6 @@ std::uint64_t nthCall(const Outcome& outcome, const std::string& function, const
     if (callText(call) == text && --occurrence == 0) return index;
   }
   return 0;
-}
-
-// The recorded calls of one function, as callText() writes them.
-std::vector<std::string> callsOf(const Outcome& outcome, const std::string& function) {
-  std::vector<std::string> texts;
-  for (const cmpihost::CallRecord& call : outcome.calls) {
-    if (call.function == function) texts.push_back(callText(call));
-  }
-  return texts;
 }
 
 bool hasCall(const Outcome& outcome, const std::string& text) {
@@ -514,7 +498,7 @@ TEST_F(SystemDeviceTest, InstancesApplyThePropertyListWithTheRealKeyNames) {
   const Outcome outcome = instances(std::vector<std::string>{"GroupComponent"});
   EXPECT_EQ(outcome.instances().size(), 2u);
   EXPECT_EQ(
-      callsOf(outcome, "setPropertyFilter"),
+      callTexts(outcome, "setPropertyFilter"),
       std::vector<std::string>(2, "CMPIInstanceFT.setPropertyFilter(instance of " + kAssocClass +
                                       ", {GroupComponent}, {GroupComponent, PartComponent})"));
 }
@@ -522,7 +506,7 @@ TEST_F(SystemDeviceTest, InstancesApplyThePropertyListWithTheRealKeyNames) {
 TEST_F(SystemDeviceTest, InstancesTakeNullAndEmptyPropertyLists) {
   const Outcome all = instances(std::nullopt);
   EXPECT_EQ(
-      callsOf(all, "setPropertyFilter"),
+      callTexts(all, "setPropertyFilter"),
       std::vector<std::string>(2, "CMPIInstanceFT.setPropertyFilter(instance of " + kAssocClass +
                                       ", NULL, {GroupComponent, PartComponent})"));
   EXPECT_EQ(all.instances().size(), 2u);
@@ -755,27 +739,8 @@ TEST_F(SystemDeviceTest, EveryCreatingCallMayFail) {
   const std::vector<std::function<Outcome()>> operations = {
       [&] { return names(); }, [&] { return instances(std::vector<std::string>{"x"}); },
       [&] { return get(associationPath("cs2", kLight1)); }};
-  for (std::size_t op = 0; op < operations.size(); ++op) {
-    broker_.clearFaults();
-    broker_.resetCreationCounts();
-    operations[op]();
-    const cmpihost::CreationCounts counts = broker_.creationCounts();
-    for (CreatingFunction function : cmpihost::allCreatingFunctions()) {
-      for (std::uint64_t nth = 1; nth <= counts[function]; ++nth) {
-        for (const Fault& fault :
-             {Fault::nullResult(function, nth), Fault::nullHandle(function, nth),
-              Fault::errorStatus(function, nth)}) {
-          SCOPED_TRACE("operation " + std::to_string(op) + ", " +
-                       ::testing::PrintToString(fault.kind) + " on " +
-                       ::testing::PrintToString(function) + " #" + std::to_string(nth));
-          broker_.clearFaults();
-          broker_.armFault(fault);
-          const Outcome outcome = operations[op]();
-          EXPECT_LE(outcome.doneCount, 1u);
-        }
-      }
-    }
-  }
+  forEveryCreatingFault(operations,
+                        [](const Outcome& outcome) { EXPECT_LE(outcome.doneCount, 1u); });
 }
 
 }  // namespace
