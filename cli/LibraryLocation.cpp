@@ -9,26 +9,33 @@ namespace fs = std::filesystem;
 
 const char* providerLibraryName() { return BLUELIGHT_CLI_LIBRARY_NAME; }
 
-std::vector<std::string> libraryCandidates(const std::string& executablePath) {
+InstallLayout configuredLayout() {
+  return InstallLayout{BLUELIGHT_CLI_INSTALL_LIBDIR, BLUELIGHT_CLI_PROVIDER_DIR,
+                       BLUELIGHT_CLI_INSTALLED_LIBRARY};
+}
+
+std::vector<std::string> libraryCandidates(const std::string& executablePath,
+                                           const InstallLayout& layout) {
   std::vector<std::string> candidates;
-  auto add = [&](const std::string& path) {
+  auto add = [&](const fs::path& path) {
+    const std::string text = path.lexically_normal().string();
     for (const std::string& known : candidates) {
-      if (known == path) return;
+      if (known == text) return;
     }
-    candidates.push_back(path);
+    candidates.push_back(text);
   };
   if (!executablePath.empty()) {
     const fs::path prefix = fs::path(executablePath).parent_path().parent_path();
-    add((prefix / "lib" / providerLibraryName()).lexically_normal().string());
-    add((prefix / BLUELIGHT_CLI_INSTALL_LIBDIR / providerLibraryName())
-            .lexically_normal()
-            .string());
-    // An installation moved to another prefix keeps the library in its CMPI directory.
-    add((prefix / BLUELIGHT_CLI_INSTALL_LIBDIR / "cmpi" / providerLibraryName())
-            .lexically_normal()
-            .string());
+    add(prefix / "lib" / providerLibraryName());
+    add(prefix / layout.libDir / providerLibraryName());
+    // An installation moved to another prefix keeps the library in its provider directory,
+    // relative to the tool's prefix.
+    const fs::path providerDir(layout.providerDir);
+    if (providerDir.is_relative()) add(prefix / providerDir / providerLibraryName());
+    add(prefix / layout.libDir / "cmpi" / providerLibraryName());
   }
-  add(BLUELIGHT_CLI_INSTALLED_LIBRARY);
+  // Where the installation put it, however the tool was moved.
+  add(layout.installedLibrary);
   return candidates;
 }
 

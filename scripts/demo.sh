@@ -3,6 +3,7 @@
 # lights as a WBEM client would see them: all four classes and a walk across both associations.
 set -euo pipefail
 cd "$(dirname "$0")/.."
+scripts/ensure-packages.sh demo
 
 # Its own build folder without the tests, so that the demo builds only what it runs.
 build_dir="${BUILD_DIR:-build-demo}"
