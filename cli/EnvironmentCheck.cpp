@@ -6,7 +6,7 @@
 #include <string_view>
 #include <system_error>
 
-#include "KestaCommon.h"
+#include "KestaCommonBase.h"
 
 namespace bluelight::cli {
 

@@ -8,7 +8,7 @@
 #include "Dispatch.h"
 #include "EnvironmentCheck.h"
 #include "HelpText.h"
-#include "KestaCommon.h"
+#include "KestaCommonBase.h"
 #include "LibraryLocation.h"
 #include "Output.h"
 #include "ProviderSession.h"

@@ -18,10 +18,10 @@
 #include <vector>
 
 #include "BlueLight.h"
-#include "KestaCommon.h"
+#include "KestaCommonBase.h"
 #include "KestaInstrumentation.h"
-#include "standalone/InstrumentationSource.h"
-#include "standalone/JsonFileSource.h"
+#include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/json/JsonFileSource.h"
 
 namespace {
 

@@ -1,21 +1,14 @@
-// The platform's common helpers that the module calls.
+// The platform's common helpers that the module calls: the CMPI-free ones (KestaCommonBase.h)
+// and the comparison of two object paths.
 #ifndef KESTA_PLATFORM_COMMON_H
 #define KESTA_PLATFORM_COMMON_H
 
 #include <cmpidt.h>
 #include <cmpift.h>
 
-#include <string>
+#include "KestaCommonBase.h"
 
 namespace Kesta {
-
-// The name of this system, used as the host name of every object path and as the SystemName key
-// of the lights:
-//   1. the environment variable KESTA_SYSTEM_NAME, when it is set and not empty (read each call);
-//   2. else the fully qualified name of the host (canonical name of gethostname()), resolved once
-//      per process and then remembered;
-//   3. else gethostname() itself.
-std::string getSystemName();
 
 // True when the two object paths name the same instance:
 //   - class names equal, ignoring case (CIM names are case-insensitive);
@@ -29,10 +22,6 @@ std::string getSystemName();
 // A null path equals nothing, not even another null path.
 bool isObjPathsEqual(const CMPIObjectPath* first, const CMPIObjectPath* second,
                      bool compareNamespaces);
-
-// `text` without its surrounding blanks (spaces, tabs, carriage returns, newlines, vertical tabs
-// and form feeds).
-std::string stripSpaces(std::string text);
 
 }  // namespace Kesta
 

@@ -8,7 +8,7 @@
 
 #include "DeployFiles.h"
 #include "TestSupport.h"
-#include "standalone/InstrumentationSource.h"
+#include "instrumentation/InstrumentationSource.h"
 
 namespace {
 

@@ -132,7 +132,7 @@ std::set<std::string> expectedFiles() {
   }
   // One caption catalogue per language the platform has a translation for.
   for (const auto& entry :
-       fs::directory_iterator(std::string(BLUELIGHT_DEPLOY_PROJECT_SOURCE_DIR) + "/platform/po")) {
+       fs::directory_iterator(std::string(BLUELIGHT_DEPLOY_PROJECT_SOURCE_DIR) + "/platform/locale/po")) {
     if (entry.path().extension() != ".po") continue;
     files.insert(std::string(BLUELIGHT_DEPLOY_FULL_LOCALEDIR) + "/" + entry.path().stem().string() +
                  "/LC_MESSAGES/bluelightprofileprovider.mo");

@@ -7,7 +7,7 @@
 #include <string>
 
 #include "PlatformTestSupport.h"
-#include "standalone/FileIo.h"
+#include "os/FileIo.h"
 
 namespace {
 

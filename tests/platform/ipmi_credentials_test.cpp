@@ -8,8 +8,8 @@
 #include <string>
 
 #include "PlatformTestSupport.h"
-#include "standalone/InstrumentationSource.h"
-#include "standalone/IpmiCredentials.h"
+#include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiCredentials.h"
 
 namespace {
 

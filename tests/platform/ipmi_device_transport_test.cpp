@@ -19,7 +19,7 @@
 #include <thread>
 #include <vector>
 
-#include "standalone/IpmiDeviceTransport.h"
+#include "instrumentation/ipmi/IpmiDeviceTransport.h"
 
 namespace {
 

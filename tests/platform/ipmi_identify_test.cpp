@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "standalone/IpmiIdentify.h"
+#include "instrumentation/ipmi/IpmiIdentify.h"
 
 namespace {
 

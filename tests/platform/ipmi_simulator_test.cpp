@@ -13,7 +13,7 @@
 #include "IpmiSimulator.h"
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
-#include "standalone/InstrumentationSource.h"
+#include "instrumentation/InstrumentationSource.h"
 
 namespace {
 

@@ -13,8 +13,8 @@
 
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
-#include "standalone/InstrumentationSource.h"
-#include "standalone/IpmiSource.h"
+#include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiSource.h"
 
 namespace {
 

@@ -5,8 +5,8 @@
 #include <chrono>
 #include <string>
 
-#include "standalone/InstrumentationSource.h"
-#include "standalone/IpmiSource.h"
+#include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiSource.h"
 
 namespace {
 

@@ -15,8 +15,8 @@
 
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
-#include "standalone/JsonFileSource.h"
-#include "standalone/Text.h"
+#include "instrumentation/json/JsonFileSource.h"
+#include "text/Text.h"
 
 namespace {
 

@@ -12,8 +12,8 @@
 
 #include "PlatformTestSupport.h"
 #include "VNLog.h"
-#include "standalone/FileIo.h"
-#include "standalone/LogFormat.h"
+#include "os/FileIo.h"
+#include "logging/LogFormat.h"
 
 namespace {
 

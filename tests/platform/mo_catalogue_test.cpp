@@ -8,7 +8,7 @@
 #include <vector>
 
 #include "PlatformTestSupport.h"
-#include "standalone/MoCatalogue.h"
+#include "locale/MoCatalogue.h"
 
 namespace {
 

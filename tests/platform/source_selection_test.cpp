@@ -6,7 +6,7 @@
 
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
-#include "standalone/InstrumentationSource.h"
+#include "instrumentation/InstrumentationSource.h"
 
 namespace {
 

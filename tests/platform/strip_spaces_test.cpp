@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "KestaCommon.h"
+#include "KestaCommonBase.h"
 
 namespace {
 

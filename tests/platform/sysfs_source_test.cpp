@@ -8,7 +8,7 @@
 
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
-#include "standalone/SysfsLedSource.h"
+#include "instrumentation/leds/SysfsLedSource.h"
 
 namespace {
 

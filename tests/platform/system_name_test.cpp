@@ -8,7 +8,7 @@
 #include <thread>
 #include <vector>
 
-#include "KestaCommon.h"
+#include "KestaCommonBase.h"
 #include "PlatformTestSupport.h"
 
 namespace {

@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "standalone/Text.h"
+#include "text/Text.h"
 
 namespace {
 

@@ -17,8 +17,8 @@
 #include <stdexcept>
 #include <thread>
 
-#include "standalone/IpmiCredentials.h"
-#include "standalone/IpmiLanTransport.h"
+#include "instrumentation/ipmi/IpmiCredentials.h"
+#include "instrumentation/ipmi/IpmiLanTransport.h"
 
 namespace ipmi_test {
 
