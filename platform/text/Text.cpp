@@ -53,11 +53,35 @@ std::size_t decodeOne(std::string_view text, char32_t& codePoint) noexcept {
   return length;
 }
 
+// Appends `prefix` and the last `digits` hex digits of `value`.
+void appendHexEscape(std::string& out, const char* prefix, unsigned int value, int digits,
+                     bool upperCase) {
+  static constexpr char kUpper[] = "0123456789ABCDEF";
+  static constexpr char kLower[] = "0123456789abcdef";
+  const char* const digitChars = upperCase ? kUpper : kLower;
+  out += prefix;
+  for (int shift = 4 * (digits - 1); shift >= 0; shift -= 4) {
+    out.push_back(digitChars[(value >> shift) & 0x0F]);
+  }
+}
+
 void appendHexByte(std::string& out, unsigned char byte) {
-  static constexpr char kDigits[] = "0123456789ABCDEF";
-  out += "\\x";
-  out.push_back(kDigits[byte >> 4]);
-  out.push_back(kDigits[byte & 0x0F]);
+  appendHexEscape(out, "\\x", byte, 2, true);
+}
+
+// Appends the escape of a control character that has no escape of its own in any style.
+void appendControlEscape(std::string& out, unsigned char byte, QuoteStyle style) {
+  switch (style) {
+    case QuoteStyle::kHexBytes:
+      appendHexByte(out, byte);
+      return;
+    case QuoteStyle::kMof:
+      appendHexEscape(out, "\\x", byte, 4, true);
+      return;
+    case QuoteStyle::kJson:
+      appendHexEscape(out, "\\u", byte, 4, false);
+      return;
+  }
 }
 
 // A wchar_t holds UTF-32 on the platforms this builds for; read it as an unsigned code point
@@ -107,6 +131,17 @@ void appendUtf8(std::string& out, char32_t codePoint) {
   }
 }
 
+void appendUtf8KeepingSurrogates(std::string& out, char16_t unit) {
+  if (unit >= 0xD800 && unit <= 0xDFFF) {
+    // The three-byte pattern of any value below U+10000, which appendUtf8 refuses for these.
+    out.push_back(static_cast<char>(0xE0 | (unit >> 12)));
+    out.push_back(static_cast<char>(0x80 | ((unit >> 6) & 0x3F)));
+    out.push_back(static_cast<char>(0x80 | (unit & 0x3F)));
+    return;
+  }
+  appendUtf8(out, unit);
+}
+
 std::size_t utf8SequenceLength(std::string_view text) noexcept {
   char32_t ignored = 0;
   return text.empty() ? 0 : decodeOne(text, ignored);
@@ -142,6 +177,48 @@ bool isValidUtf8(std::string_view text) noexcept {
     text.remove_prefix(length);
   }
   return true;
+}
+
+std::string quoted(std::string_view text, QuoteStyle style) {
+  std::string out;
+  out.reserve(text.size() + 2);
+  out += '"';
+  for (const char c : text) {
+    const auto byte = static_cast<unsigned char>(c);
+    switch (c) {
+      case '"':
+        out += "\\\"";
+        break;
+      case '\\':
+        out += "\\\\";
+        break;
+      case '\n':
+        out += "\\n";
+        break;
+      case '\t':
+        out += "\\t";
+        break;
+      case '\r':
+        out += "\\r";
+        break;
+      case '\b':
+      case '\f':
+        if (style == QuoteStyle::kMof) {
+          out += c == '\b' ? "\\b" : "\\f";
+        } else {
+          appendControlEscape(out, byte, style);
+        }
+        break;
+      default:
+        if (byte < 0x20 || (byte == 0x7F && style == QuoteStyle::kMof)) {
+          appendControlEscape(out, byte, style);
+        } else {
+          out += c;
+        }
+    }
+  }
+  out += '"';
+  return out;
 }
 
 std::string printable(std::string_view text) {
