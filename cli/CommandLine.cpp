@@ -1,7 +1,5 @@
 #include "CommandLine.h"
 
-#include <cmpihost/value.h>
-
 #include <cctype>
 #include <map>
 #include <string_view>
@@ -10,6 +8,7 @@
 #include "ReturnCodes.h"
 #include "TextForms.h"
 #include "UsageError.h"
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -132,7 +131,8 @@ void checkAgainstOperation(CommandLine& line) {
   if (info.takesAssocClass) return;
   if (line.resultRole) refuse("--result-role");
   if (line.assocClass) {
-    if (line.resultClass && !cmpihost::equalsIgnoreCase(*line.resultClass, *line.assocClass)) {
+    if (line.resultClass &&
+        !Kesta::platform::equalsIgnoringCase(*line.resultClass, *line.assocClass)) {
       throw UsageError("--assoc-class and --result-class both name the association class of " +
                        name + " and must agree");
     }

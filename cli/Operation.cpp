@@ -1,8 +1,8 @@
 #include "Operation.h"
 
-#include <cmpihost/value.h>
-
 #include <stdexcept>
+
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -33,9 +33,9 @@ const OperationInfo& infoOf(Operation operation) {
 
 const OperationInfo* findOperation(std::string_view name) {
   for (const OperationInfo& info : allOperations()) {
-    if (cmpihost::equalsIgnoreCase(name, info.shortName) ||
-        cmpihost::equalsIgnoreCase(name, info.longName) ||
-        cmpihost::equalsIgnoreCase(name, info.cimName)) {
+    if (Kesta::platform::equalsIgnoringCase(name, info.shortName) ||
+        Kesta::platform::equalsIgnoringCase(name, info.longName) ||
+        Kesta::platform::equalsIgnoringCase(name, info.cimName)) {
       return &info;
     }
   }

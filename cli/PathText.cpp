@@ -11,6 +11,7 @@
 
 #include "TextForms.h"
 #include "UsageError.h"
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -302,8 +303,8 @@ class PathReader {
     while (!atEnd() && peek() != ',') ++pos_;
     std::string_view token = text_.substr(start, pos_ - start);
     while (!token.empty() && isBlank(token.back())) token.remove_suffix(1);
-    if (cmpihost::equalsIgnoreCase(token, "true")) return Value::boolean(true);
-    if (cmpihost::equalsIgnoreCase(token, "false")) return Value::boolean(false);
+    if (Kesta::platform::equalsIgnoringCase(token, "true")) return Value::boolean(true);
+    if (Kesta::platform::equalsIgnoringCase(token, "false")) return Value::boolean(false);
     bool outOfRange = false;
     if (std::optional<Value> number = numberValue(token, outOfRange)) return *number;
     if (outOfRange) {

@@ -1,6 +1,6 @@
 #include "ProviderMap.h"
 
-#include <cmpihost/value.h>
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -16,7 +16,7 @@ const std::vector<ProviderInfo>& allProviders() {
 
 const ProviderInfo* instanceProviderFor(std::string_view className) {
   for (const ProviderInfo& provider : allProviders()) {
-    if (cmpihost::equalsIgnoreCase(className, provider.className)) return &provider;
+    if (Kesta::platform::equalsIgnoringCase(className, provider.className)) return &provider;
   }
   return nullptr;
 }
@@ -36,7 +36,8 @@ std::vector<const ProviderInfo*> associationProviders() {
 
 std::string canonicalClassName(std::string_view className) {
   if (const ProviderInfo* provider = instanceProviderFor(className)) return provider->className;
-  if (cmpihost::equalsIgnoreCase(className, kComputerSystemClass)) return kComputerSystemClass;
+  if (Kesta::platform::equalsIgnoringCase(className, kComputerSystemClass))
+    return kComputerSystemClass;
   return std::string(className);
 }
 

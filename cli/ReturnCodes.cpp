@@ -1,9 +1,10 @@
 #include "ReturnCodes.h"
 
 #include <cmpihost/status.h>
-#include <cmpihost/value.h>
 
 #include <charconv>
+
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -52,8 +53,8 @@ std::optional<CMPIrc> parseReturnCode(std::string_view text) {
       continue;
     }
     const std::string name = returnCodeName(code);
-    if (cmpihost::equalsIgnoreCase(text, name) ||
-        cmpihost::equalsIgnoreCase(text, std::string_view(name).substr(prefix.size()))) {
+    if (Kesta::platform::equalsIgnoringCase(text, name) ||
+        Kesta::platform::equalsIgnoringCase(text, std::string_view(name).substr(prefix.size()))) {
       return code;
     }
   }

@@ -95,26 +95,26 @@ bool BrokerCore::isMark(const void* mark) const {
 
 void BrokerCore::setClassKeys(std::string className, std::vector<std::string> keys) {
   std::lock_guard<std::mutex> lock(configMutex_);
-  std::string lower = lowerCase(className);
+  std::string lower = asciiLowerCopy(className);
   classKeys_[std::move(lower)] = {std::move(className), std::move(keys)};
 }
 
 std::optional<std::vector<std::string>> BrokerCore::classKeys(std::string_view className) const {
   std::lock_guard<std::mutex> lock(configMutex_);
-  const auto it = classKeys_.find(lowerCase(className));
+  const auto it = classKeys_.find(asciiLowerCopy(className));
   if (it == classKeys_.end()) return std::nullopt;
   return it->second.second;
 }
 
 void BrokerCore::setSuperclass(std::string className, std::string superclass) {
   std::lock_guard<std::mutex> lock(configMutex_);
-  superclasses_[lowerCase(className)] = lowerCase(superclass);
+  superclasses_[asciiLowerCopy(className)] = asciiLowerCopy(superclass);
 }
 
 bool BrokerCore::classIsA(std::string_view className, std::string_view type) const {
   std::lock_guard<std::mutex> lock(configMutex_);
-  std::string current = lowerCase(className);
-  const std::string wanted = lowerCase(type);
+  std::string current = asciiLowerCopy(className);
+  const std::string wanted = asciiLowerCopy(type);
   // The chain is bounded by the number of declared superclasses, so a cycle cannot loop forever.
   for (std::size_t steps = 0; steps <= superclasses_.size(); ++steps) {
     if (current == wanted) return true;
@@ -127,12 +127,12 @@ bool BrokerCore::classIsA(std::string_view className, std::string_view type) con
 
 void BrokerCore::setUpcallAnswer(std::string className, UpcallAnswer answer) {
   std::lock_guard<std::mutex> lock(configMutex_);
-  upcalls_[lowerCase(className)] = std::move(answer);
+  upcalls_[asciiLowerCopy(className)] = std::move(answer);
 }
 
 void BrokerCore::clearUpcall(std::string_view className) {
   std::lock_guard<std::mutex> lock(configMutex_);
-  upcalls_.erase(lowerCase(className));
+  upcalls_.erase(asciiLowerCopy(className));
 }
 
 void BrokerCore::clearUpcalls() {
@@ -142,7 +142,7 @@ void BrokerCore::clearUpcalls() {
 
 UpcallAnswer BrokerCore::upcallAnswer(std::string_view className) const {
   std::lock_guard<std::mutex> lock(configMutex_);
-  const auto it = upcalls_.find(lowerCase(className));
+  const auto it = upcalls_.find(asciiLowerCopy(className));
   return it != upcalls_.end() ? it->second : UpcallAnswer{};
 }
 

@@ -61,7 +61,7 @@ CMPIStatus upDeliverIndication(const CMPIBroker* broker, const CMPIContext* cont
 
 bool isListed(const char** names, const std::string& name) {
   for (const char** listed = names; *listed != nullptr; ++listed) {
-    if (equalsIgnoreCase(*listed, name)) return true;
+    if (equalsIgnoringCase(*listed, name)) return true;
   }
   return false;
 }
@@ -69,7 +69,7 @@ bool isListed(const char** names, const std::string& name) {
 bool isKeyName(const std::optional<std::vector<std::string>>& keyNames, const std::string& name) {
   if (!keyNames) return false;
   for (const std::string& key : *keyNames) {
-    if (equalsIgnoreCase(key, name)) return true;
+    if (equalsIgnoringCase(key, name)) return true;
   }
   return false;
 }

@@ -11,7 +11,7 @@ namespace cmpihost::detail {
 
 void NamedValues::set(std::string name, Value value) {
   for (Property& entry : entries_) {
-    if (equalsIgnoreCase(entry.name, name)) {
+    if (equalsIgnoringCase(entry.name, name)) {
       entry.value = std::move(value);
       return;
     }
@@ -21,7 +21,7 @@ void NamedValues::set(std::string name, Value value) {
 
 const Value* NamedValues::find(std::string_view name) const {
   for (const Property& entry : entries_) {
-    if (equalsIgnoreCase(entry.name, name)) return &entry.value;
+    if (equalsIgnoringCase(entry.name, name)) return &entry.value;
   }
   return nullptr;
 }

@@ -195,7 +195,7 @@ InstanceObject::InstanceObject(ObjectScope& scope, InstanceValue value)
 bool InstanceObject::accepts(std::string_view name) const {
   if (!filter_) return true;
   for (const std::string& accepted : *filter_) {
-    if (equalsIgnoreCase(accepted, name)) return true;
+    if (equalsIgnoringCase(accepted, name)) return true;
   }
   return false;
 }

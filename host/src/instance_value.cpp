@@ -3,6 +3,8 @@
 
 #include <cmpihost/value.h>
 
+#include "text.h"
+
 namespace cmpihost {
 
 InstanceValue::InstanceValue(ObjectPathValue path) : path_(std::move(path)) {}
@@ -14,7 +16,7 @@ InstanceValue& InstanceValue::setPath(ObjectPathValue path) {
 
 InstanceValue& InstanceValue::set(std::string name, Value value) {
   for (Property& property : properties_) {
-    if (equalsIgnoreCase(property.name, name)) {
+    if (equalsIgnoringCase(property.name, name)) {
       property.value = std::move(value);
       return *this;
     }
@@ -25,7 +27,7 @@ InstanceValue& InstanceValue::set(std::string name, Value value) {
 
 bool InstanceValue::remove(std::string_view name) {
   const auto it = std::find_if(properties_.begin(), properties_.end(),
-                               [&](const Property& p) { return equalsIgnoreCase(p.name, name); });
+                               [&](const Property& p) { return equalsIgnoringCase(p.name, name); });
   if (it == properties_.end()) return false;
   properties_.erase(it);
   return true;
@@ -33,7 +35,7 @@ bool InstanceValue::remove(std::string_view name) {
 
 const Value* InstanceValue::find(std::string_view name) const {
   for (const Property& property : properties_) {
-    if (equalsIgnoreCase(property.name, name)) return &property.value;
+    if (equalsIgnoringCase(property.name, name)) return &property.value;
   }
   return nullptr;
 }

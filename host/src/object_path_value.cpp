@@ -30,7 +30,7 @@ ObjectPathValue& ObjectPathValue::setClassName(std::string className) {
 
 ObjectPathValue& ObjectPathValue::addKey(std::string name, Value value) {
   for (KeyBinding& key : keys_) {
-    if (equalsIgnoreCase(key.name, name)) {
+    if (equalsIgnoringCase(key.name, name)) {
       key.value = std::move(value);
       return *this;
     }
@@ -41,7 +41,7 @@ ObjectPathValue& ObjectPathValue::addKey(std::string name, Value value) {
 
 bool ObjectPathValue::removeKey(std::string_view name) {
   const auto it = std::find_if(keys_.begin(), keys_.end(), [&](const KeyBinding& key) {
-    return equalsIgnoreCase(key.name, name);
+    return equalsIgnoringCase(key.name, name);
   });
   if (it == keys_.end()) return false;
   keys_.erase(it);
@@ -55,7 +55,7 @@ ObjectPathValue& ObjectPathValue::clearKeys() {
 
 const Value* ObjectPathValue::findKey(std::string_view name) const {
   for (const KeyBinding& key : keys_) {
-    if (equalsIgnoreCase(key.name, name)) return &key.value;
+    if (equalsIgnoringCase(key.name, name)) return &key.value;
   }
   return nullptr;
 }
@@ -148,8 +148,8 @@ std::optional<std::string> readQuoted(std::string_view text, std::size_t& pos) {
 
 std::optional<Value> readBareValue(std::string_view token) {
   if (token.empty()) return std::nullopt;
-  if (equalsIgnoreCase(token, "true")) return Value::boolean(true);
-  if (equalsIgnoreCase(token, "false")) return Value::boolean(false);
+  if (equalsIgnoringCase(token, "true")) return Value::boolean(true);
+  if (equalsIgnoringCase(token, "false")) return Value::boolean(false);
   if (token == "NULL") return Value::null();
   if (token.size() == 3 && token.front() == '\'' && token.back() == '\'') {
     return Value::char16(static_cast<unsigned char>(token[1]));
@@ -225,8 +225,8 @@ std::optional<ObjectPathValue> ObjectPathValue::parse(std::string_view text) {
 }
 
 bool ObjectPathValue::equivalent(const ObjectPathValue& other) const {
-  if (!equalsIgnoreCase(nameSpace_, other.nameSpace_) ||
-      !equalsIgnoreCase(className_, other.className_) || keys_.size() != other.keys_.size()) {
+  if (!equalsIgnoringCase(nameSpace_, other.nameSpace_) ||
+      !equalsIgnoringCase(className_, other.className_) || keys_.size() != other.keys_.size()) {
     return false;
   }
   for (const KeyBinding& key : keys_) {

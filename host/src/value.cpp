@@ -1,7 +1,6 @@
 #include <cmpihost/status.h>
 #include <cmpihost/value.h>
 
-#include <cctype>
 #include <utility>
 
 #include "text.h"
@@ -32,17 +31,6 @@ bool isSignedType(CMPIType type) {
 }
 
 }  // namespace
-
-bool equalsIgnoreCase(std::string_view a, std::string_view b) {
-  if (a.size() != b.size()) return false;
-  for (std::size_t i = 0; i < a.size(); ++i) {
-    if (std::tolower(static_cast<unsigned char>(a[i])) !=
-        std::tolower(static_cast<unsigned char>(b[i]))) {
-      return false;
-    }
-  }
-  return true;
-}
 
 // ---- Value ----------------------------------------------------------------------------------
 

@@ -23,10 +23,6 @@ namespace cmpihost {
 class ObjectPathValue;
 class InstanceValue;
 
-/// True when the two names are equal ignoring ASCII case, the way CIM compares names of classes,
-/// properties, keys and namespaces.
-bool equalsIgnoreCase(std::string_view a, std::string_view b);
-
 /// Thrown by the typed accessors of Value when the value is null or of another kind.
 class BadValueAccess : public std::logic_error {
  public:
