@@ -4,6 +4,7 @@
 
 #include "PathText.h"
 #include "ReturnCodes.h"
+#include "text/Text.h"
 
 namespace bluelight::cli {
 
@@ -52,18 +53,11 @@ std::string elementTypeName(CMPIType type) {
   }
 }
 
+// A char16 value holds one 16-bit unit; it is written as formatKeyValue writes it in paths, a
+// surrogate included.
 std::string char16Text(CMPIUint64 code) {
   std::string text;
-  if (code < 0x80) {
-    text += static_cast<char>(code);
-  } else if (code < 0x800) {
-    text += static_cast<char>(0xC0 | (code >> 6));
-    text += static_cast<char>(0x80 | (code & 0x3F));
-  } else {
-    text += static_cast<char>(0xE0 | ((code >> 12) & 0x0F));
-    text += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
-    text += static_cast<char>(0x80 | (code & 0x3F));
-  }
+  Kesta::platform::appendUtf8KeepingSurrogates(text, static_cast<char16_t>(code));
   return text;
 }
 

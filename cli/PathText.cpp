@@ -40,19 +40,6 @@ unsigned int hexValue(char c) {
   return static_cast<unsigned int>(std::tolower(static_cast<unsigned char>(c)) - 'a' + 10);
 }
 
-void appendUtf8(std::string& out, unsigned int codePoint) {
-  if (codePoint < 0x80) {
-    out += static_cast<char>(codePoint);
-  } else if (codePoint < 0x800) {
-    out += static_cast<char>(0xC0 | (codePoint >> 6));
-    out += static_cast<char>(0x80 | (codePoint & 0x3F));
-  } else {
-    out += static_cast<char>(0xE0 | (codePoint >> 12));
-    out += static_cast<char>(0x80 | ((codePoint >> 6) & 0x3F));
-    out += static_cast<char>(0x80 | (codePoint & 0x3F));
-  }
-}
-
 // Whole numbers become sint64 (uint64 when only that holds them), other numbers real64.
 std::optional<Value> numberValue(std::string_view token, bool& outOfRange) {
   outOfRange = false;
@@ -293,8 +280,9 @@ class PathReader {
       fail("\\x must be followed by 1 to 4 hex digits in the value of key " + key, escapeAt);
     }
     if (codePoint == 0) fail("\\x0 (a NUL character) cannot be part of a value", escapeAt);
+    // Four hex digits at most: one char16, a surrogate included, passed on as the user wrote it.
     std::string out;
-    appendUtf8(out, codePoint);
+    Kesta::platform::appendUtf8KeepingSurrogates(out, static_cast<char16_t>(codePoint));
     return out;
   }
 
@@ -367,7 +355,7 @@ std::string formatKeyValue(const Value& value) {
       return value.asBoolean() ? "TRUE" : "FALSE";
     case CMPI_char16: {
       std::string text;
-      appendUtf8(text, static_cast<unsigned int>(value.asUnsigned()));
+      Kesta::platform::appendUtf8KeepingSurrogates(text, static_cast<char16_t>(value.asUnsigned()));
       return quote(text);
     }
     case CMPI_uint8:

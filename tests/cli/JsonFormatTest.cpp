@@ -30,6 +30,30 @@ TEST(JsonFormat, ScalarsKeepTheirJsonType) {
   EXPECT_EQ(jsonValue(Value::null(CMPI_string)).dump(), "null");
 }
 
+// A char16 is a one-character string: its 16-bit unit in UTF-8, a surrogate in its three-byte form
+// as in paths.
+TEST(JsonFormat, Char16IsItsCharacterInUtf8) {
+  const struct {
+    CMPIChar16 unit;
+    std::string expected;
+  } cases[] = {
+      {'x', "x"},
+      {0x0A, "\n"},
+      {0x7F, "\x7F"},
+      {0x80, "\xC2\x80"},
+      {0xE9, "\xC3\xA9"},
+      {0x7FF, "\xDF\xBF"},
+      {0x800, "\xE0\xA0\x80"},
+      {0x263A, "\xE2\x98\xBA"},
+      {0xD800, "\xED\xA0\x80"},
+      {0xDFFF, "\xED\xBF\xBF"},
+      {0xFFFF, "\xEF\xBF\xBF"},
+  };
+  for (const auto& c : cases) {
+    EXPECT_EQ(jsonValue(Value::char16(c.unit)).get<std::string>(), c.expected) << c.unit;
+  }
+}
+
 TEST(JsonFormat, ArraysAndReferences) {
   EXPECT_EQ(jsonValue(Value::array(CMPI_uint16, {Value::uint16(3), Value::uint16(5)})).dump(),
             "[3,5]");

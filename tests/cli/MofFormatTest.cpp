@@ -128,5 +128,30 @@ TEST(TextForms, QuoteKeepsEverythingOnOneLine) {
   EXPECT_EQ(quote(std::string("nul\0x", 5)), R"("nul\x0000x")");
 }
 
+// The tool's one quoted form is MOF's: \b and \f have short escapes, the other controls and DEL
+// are \xHHHH, which the path reader reads back.
+TEST(TextForms, QuoteWritesMofEscapes) {
+  const struct {
+    std::string text;
+    std::string expected;
+  } cases[] = {
+      {"", R"("")"},
+      {"Blue Light:1.2", R"("Blue Light:1.2")"},
+      {R"(a "b" \ c)", R"("a \"b\" \\ c")"},
+      {"n\nt\tr\r", R"("n\nt\tr\r")"},
+      {"b\bf\f", R"("b\bf\f")"},
+      {"\x01", R"("\x0001")"},
+      {"\x1B[1m", R"("\x001B[1m")"},
+      {"\x1F", R"("\x001F")"},
+      {"del\x7F", R"("del\x007F")"},
+      {"'single'", R"("'single'")"},
+      {"Licht \xC3\xA4", "\"Licht \xC3\xA4\""},
+      {"\xFF", "\"\xFF\""},
+  };
+  for (const auto& c : cases) {
+    EXPECT_EQ(quote(c.text), c.expected) << c.expected;
+  }
+}
+
 }  // namespace
 }  // namespace bluelight::cli

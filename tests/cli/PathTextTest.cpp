@@ -101,6 +101,33 @@ TEST(PathText, Escapes) {
   EXPECT_EQ(path.findKey("x")->asString(), "A\xC3\xA9\xE2\x98\xBA");
 }
 
+// A \x escape is one char16 of one to four hex digits, in UTF-8; a surrogate is passed on in its
+// three-byte form rather than replaced, exactly as written.
+TEST(PathText, HexEscapesBecomeUtf8) {
+  const struct {
+    const char* escape;
+    std::string expected;
+  } cases[] = {
+      {R"(\x41)", "A"},
+      {R"(\x7f)", "\x7F"},
+      {R"(\x80)", "\xC2\x80"},
+      {R"(\x00e9)", "\xC3\xA9"},
+      {R"(\X7FF)", "\xDF\xBF"},
+      {R"(\x800)", "\xE0\xA0\x80"},
+      {R"(\x263A)", "\xE2\x98\xBA"},
+      {R"(\xD800)", "\xED\xA0\x80"},
+      {R"(\xdfff)", "\xED\xBF\xBF"},
+      {R"(\xFFFF)", "\xEF\xBF\xBF"},
+      {R"(\x263A1)",
+       "\xE2\x98\xBA"
+       "1"},
+  };
+  for (const auto& c : cases) {
+    const ObjectPathValue path = parseObjectPath(std::string("C.a=\"") + c.escape + "\"", "ns");
+    EXPECT_EQ(path.findKey("a")->asString(), c.expected) << c.escape;
+  }
+}
+
 TEST(PathText, QuotedPathWithKeysIsAReference) {
   const ObjectPathValue path = parseObjectPath(
       R"(KESTA_BlueLightElementCapabilities.ManagedElement="root/cimv2:KESTA_BlueLight.)"
@@ -234,6 +261,28 @@ TEST(PathText, FormatKeyValues) {
   ObjectPathValue inner("root/cimv2", "C");
   inner.addKey("k", "v");
   EXPECT_EQ(formatKeyValue(Value::reference(inner)), R"("root/cimv2:C.k=\"v\"")");
+}
+
+// A char16 key value is its one character in UTF-8, quoted like a string; a surrogate keeps its
+// three-byte form.
+TEST(PathText, FormatChar16KeyValues) {
+  const struct {
+    CMPIChar16 unit;
+    std::string expected;
+  } cases[] = {
+      {'x', R"("x")"},
+      {'"', R"("\"")"},
+      {0x0A, R"("\n")"},
+      {0x01, R"("\x0001")"},
+      {0x7F, R"("\x007F")"},
+      {0xE9, "\"\xC3\xA9\""},
+      {0x263A, "\"\xE2\x98\xBA\""},
+      {0xD800, "\"\xED\xA0\x80\""},
+      {0xFFFF, "\"\xEF\xBF\xBF\""},
+  };
+  for (const auto& c : cases) {
+    EXPECT_EQ(formatKeyValue(Value::char16(c.unit)), c.expected) << c.unit;
+  }
 }
 
 TEST(PathText, FormattedPathsReadBackEqual) {
