@@ -3,7 +3,6 @@
 #include <stdlib.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <regex>
@@ -11,6 +10,7 @@
 #include <stdexcept>
 
 #include "VNLog.h"
+#include "text/Text.h"
 
 namespace testsupport {
 
@@ -53,50 +53,16 @@ Node blueLight(const std::string& path, std::optional<unsigned> status,
   return node;
 }
 
-namespace {
-
-std::string jsonString(const std::string& text) {
-  std::string out = "\"";
-  for (unsigned char c : text) {
-    switch (c) {
-      case '"':
-        out += "\\\"";
-        break;
-      case '\\':
-        out += "\\\\";
-        break;
-      case '\n':
-        out += "\\n";
-        break;
-      case '\t':
-        out += "\\t";
-        break;
-      case '\r':
-        out += "\\r";
-        break;
-      default:
-        if (c < 0x20) {
-          char escaped[8];
-          std::snprintf(escaped, sizeof escaped, "\\u%04x", c);
-          out += escaped;
-        } else {
-          out += static_cast<char>(c);
-        }
-    }
-  }
-  return out + "\"";
-}
-
-}  // namespace
-
 std::string treeJson(const std::vector<Node>& nodes) {
+  using Kesta::platform::quoted;
+  using Kesta::platform::QuoteStyle;
   std::ostringstream out;
   out << "{\"nodes\": [";
   for (std::size_t i = 0; i < nodes.size(); ++i) {
     const Node& node = nodes[i];
     if (i != 0) out << ",";
-    out << "\n  {\"type\": " << node.type << ", \"path\": " << jsonString(node.path)
-        << ", \"description\": " << jsonString(node.description);
+    out << "\n  {\"type\": " << node.type << ", \"path\": " << quoted(node.path, QuoteStyle::kJson)
+        << ", \"description\": " << quoted(node.description, QuoteStyle::kJson);
     if (node.status) out << ", \"status\": " << *node.status;
     if (!node.properties.empty()) {
       out << ", \"properties\": {";
