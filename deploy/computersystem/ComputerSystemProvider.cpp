@@ -12,12 +12,12 @@
 #include <cmpidt.h>
 #include <cmpift.h>
 #include <cmpimacs.h>
-#include <strings.h>
 
 #include <atomic>
 #include <string>
 
 #include "KestaCommon.h"
+#include "text/Text.h"
 
 namespace Kesta {
 namespace ComputerSystemProvider {
@@ -71,7 +71,7 @@ std::string nameSpaceOf(const CMPIObjectPath* ref) {
 bool wanted(const char** properties, const char* name) {
   if (properties == nullptr) return true;
   for (const char** entry = properties; *entry != nullptr; ++entry) {
-    if (strcasecmp(*entry, name) == 0) return true;
+    if (platform::equalsIgnoringCase(*entry, name)) return true;
   }
   return false;
 }
@@ -128,15 +128,16 @@ CMPIInstance* systemInstance(const CMPIBroker* mb, const CMPIObjectPath* ref,
 }
 
 // True when `cop` names this system: both keys present, CreationClassName equal to the class
-// name and Name equal to the system name. Both comparisons ignore case, because class names are
-// case-insensitive in CIM and so are DNS names.
+// name and Name equal to the system name. Both comparisons ignore ASCII case, because class names
+// are case-insensitive in CIM and so are DNS names, and neither depends on the locale the object
+// manager's process may have set.
 bool namesThisSystem(const CMPIObjectPath* cop, const std::string& systemName) {
   if (CMIsNullObject(cop)) return false;
   const char* creationClassName = charsOfData(CMGetKey(cop, "CreationClassName", nullptr));
   const char* name = charsOfData(CMGetKey(cop, "Name", nullptr));
   return creationClassName != nullptr && name != nullptr &&
-         strcasecmp(creationClassName, kClassName) == 0 &&
-         strcasecmp(name, systemName.c_str()) == 0;
+         platform::equalsIgnoringCase(creationClassName, kClassName) &&
+         platform::equalsIgnoringCase(name, systemName);
 }
 
 CMPIStatus cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return status(CMPI_RC_OK); }
