@@ -1,29 +1,32 @@
 # Turns the provider table (deploy/providers.txt) into the registration files of both object
-# managers, one pair per provider library:
+# managers, one pair per provider library, and into the C++ header that gives the module and the
+# command-line tool the same names:
 #   <OUTPUT_DIR>/sfcb/<library>.reg                      sfcb provider registration
 #   <OUTPUT_DIR>/pegasus/<library>-registration.mof      OpenPegasus PG_ProviderModule & co.
+#   <HEADER>                                             the table as C++ preprocessor lists
 #
 # bluelight_generate_registrations(
-#     TABLE <file> OUTPUT_DIR <dir> VENDOR <text> VERSION <text>
+#     TABLE <file> OUTPUT_DIR <dir> VENDOR <text> VERSION <text> [HEADER <file>]
 #     [SFCB_FILES <var>] [PEGASUS_FILES <var>] [LIBRARIES <var>])
 #
 # Runs at configure time; the table is a configure dependency, so editing it regenerates the
 # files on the next build. Files are rewritten only when their text changes.
 
-# Splits one table line into its five fields, or fails the configuration naming the line.
+# Splits one table line into its six fields, or fails the configuration naming the line.
 function(_bluelight_parse_table_line line number table out_prefix)
   string(REGEX REPLACE "[ \t]+" ";" fields "${line}")
   list(LENGTH fields count)
-  if(NOT count EQUAL 5)
-    message(FATAL_ERROR "${table}:${number}: expected 5 columns (class provider kinds library "
-                        "namespaces), found ${count}: ${line}")
+  if(NOT count EQUAL 6)
+    message(FATAL_ERROR "${table}:${number}: expected 6 columns (class provider kinds library "
+                        "namespaces symbol), found ${count}: ${line}")
   endif()
   list(GET fields 0 class)
   list(GET fields 1 provider)
   list(GET fields 2 kinds)
   list(GET fields 3 library)
   list(GET fields 4 namespaces)
-  foreach(name IN ITEMS "${class}" "${provider}" "${library}")
+  list(GET fields 5 symbol)
+  foreach(name IN ITEMS "${class}" "${provider}" "${library}" "${symbol}")
     if(NOT name MATCHES "^[A-Za-z_][A-Za-z0-9_]*$")
       message(FATAL_ERROR "${table}:${number}: \"${name}\" is not a CIM or C identifier")
     endif()
@@ -49,7 +52,7 @@ function(_bluelight_parse_table_line line number table out_prefix)
   if(NOT location)
     set(location ${library})
   endif()
-  foreach(part class provider kinds library location namespaces)
+  foreach(part class provider kinds library location namespaces symbol)
     set(${out_prefix}_${part} "${${part}}" PARENT_SCOPE)
   endforeach()
 endfunction()
@@ -65,7 +68,8 @@ function(_bluelight_mof_string_array out)
 endfunction()
 
 function(bluelight_generate_registrations)
-  cmake_parse_arguments(ARG "" "TABLE;OUTPUT_DIR;VENDOR;VERSION;SFCB_FILES;PEGASUS_FILES;LIBRARIES"
+  cmake_parse_arguments(ARG ""
+                        "TABLE;OUTPUT_DIR;VENDOR;VERSION;HEADER;SFCB_FILES;PEGASUS_FILES;LIBRARIES"
                         "" ${ARGN})
   foreach(required TABLE OUTPUT_DIR VENDOR VERSION)
     if(NOT ARG_${required})
@@ -78,6 +82,8 @@ function(bluelight_generate_registrations)
   file(STRINGS ${ARG_TABLE} lines)
   set(libraries "")
   set(classes "")
+  set(symbols "")
+  set(header_classes "")
   set(number 0)
   foreach(line IN LISTS lines)
     math(EXPR number "${number} + 1")
@@ -91,6 +97,10 @@ function(bluelight_generate_registrations)
       message(FATAL_ERROR "${table_name}:${number}: class ${row_class} is listed twice")
     endif()
     list(APPEND classes ${class_key})
+    if(row_symbol IN_LIST symbols)
+      message(FATAL_ERROR "${table_name}:${number}: symbol ${row_symbol} is used twice")
+    endif()
+    list(APPEND symbols ${row_symbol})
 
     set(lib ${row_library})
     if(NOT lib IN_LIST libraries)
@@ -99,6 +109,24 @@ function(bluelight_generate_registrations)
       set(providers_${lib} "")
       set(sfcb_${lib} "")
       set(capabilities_${lib} "")
+      set(header_rows_${lib} "")
+      set(header_providers_${lib} "")
+    endif()
+
+    # The header: every class under its symbol; per library, its rows and its distinct providers.
+    set(instance false)
+    set(association false)
+    if("instance" IN_LIST row_kinds)
+      set(instance true)
+    endif()
+    if("association" IN_LIST row_kinds)
+      set(association true)
+    endif()
+    string(APPEND header_classes " \\\n  X(${row_symbol}, \"${row_class}\")")
+    string(APPEND header_rows_${lib}
+      " \\\n  X(\"${row_class}\", \"${row_provider}\", ${instance}, ${association})")
+    if(NOT row_provider IN_LIST providers_${lib})
+      string(APPEND header_providers_${lib} " \\\n  X(${row_provider}, \"${row_provider}\")")
     endif()
 
     # sfcb: one section per class. Providers of one library share a group, so sfcb loads the
@@ -189,6 +217,41 @@ ${pegasus_providers}${capabilities}
 ")
     list(APPEND pegasus_files ${pegasus_file})
   endforeach()
+
+  if(ARG_HEADER)
+    set(header_libraries "")
+    foreach(lib IN LISTS libraries)
+      string(APPEND header_libraries
+        "\n// The rows of ${lib}.\n"
+        "#define BLUELIGHT_TABLE_ROWS_${lib}(X)${header_rows_${lib}}\n"
+        "\n// The providers of ${lib}, each once.\n"
+        "#define BLUELIGHT_TABLE_PROVIDERS_${lib}(X)${header_providers_${lib}}\n")
+    endforeach()
+    file(CONFIGURE OUTPUT ${ARG_HEADER} @ONLY CONTENT
+"// The provider table for C++: the class and provider names of the module and of the command-line
+// tool come from here, so they are the names the registrations carry.
+// Generated by the build from ${table_name}; edit that table, not this file.
+//
+// Each list calls the macro X it is given once per entry, in the table's order:
+//   BLUELIGHT_TABLE_CLASSES(X)            X(symbol, \"class\") for every row; symbol is the
+//                                         table's symbol column, the name of the constant that
+//                                         holds the class name
+//   BLUELIGHT_TABLE_ROWS_<library>(X)     X(\"class\", \"provider\", instance, association) for
+//                                         every row of that library; instance and association
+//                                         are true when the kinds column names them
+//   BLUELIGHT_TABLE_PROVIDERS_<library>(X)  X(provider, \"provider\") for every provider of that
+//                                         library, each once; a provider's name is an
+//                                         identifier too, as its factory functions show
+// <library> is the table's library column.
+#ifndef BLUELIGHT_PROVIDERTABLE_H
+#define BLUELIGHT_PROVIDERTABLE_H
+
+// Every class of the table.
+#define BLUELIGHT_TABLE_CLASSES(X)${header_classes}
+${header_libraries}
+#endif  // BLUELIGHT_PROVIDERTABLE_H
+")
+  endif()
 
   if(ARG_SFCB_FILES)
     set(${ARG_SFCB_FILES} ${sfcb_files} PARENT_SCOPE)
