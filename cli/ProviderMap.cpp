@@ -1,16 +1,30 @@
 #include "ProviderMap.h"
 
+#include "ProviderTable.h"
 #include "text/Text.h"
 
 namespace bluelight::cli {
 
+namespace {
+
+// The class names of deploy/providers.txt, named by its symbol column as in the module.
+#define BLUELIGHT_CLI_CLASS_NAME(symbol, className) \
+  [[maybe_unused]] constexpr const char* symbol = className;
+BLUELIGHT_TABLE_CLASSES(BLUELIGHT_CLI_CLASS_NAME)
+#undef BLUELIGHT_CLI_CLASS_NAME
+
+}  // namespace
+
+const char* const kComputerSystemClass = ComputerSystemClass;
+
 const std::vector<ProviderInfo>& allProviders() {
+  // Every row has an instance MI: object managers route the instance operations of association
+  // classes to it too, and the deploy tests hold the table to that.
+#define BLUELIGHT_CLI_PROVIDER(className, provider, instance, association) \
+  {provider, className, association},
   static const std::vector<ProviderInfo> providers = {
-      {"BlueLightProfileProvider", "KESTA_BlueLight", false},
-      {"BlueLightCapabilitiesProvider", "KESTA_BlueLightCapabilities", false},
-      {"BlueLightElementCapabilitiesProvider", "KESTA_BlueLightElementCapabilities", true},
-      {"BlueLightSystemDeviceProvider", "KESTA_BlueLightSystemDevice", true},
-  };
+      BLUELIGHT_TABLE_ROWS_bluelightprofileprovider(BLUELIGHT_CLI_PROVIDER)};
+#undef BLUELIGHT_CLI_PROVIDER
   return providers;
 }
 

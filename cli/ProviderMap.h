@@ -1,5 +1,5 @@
 // Which provider of the library serves which class, as an object manager's provider
-// registration would say it.
+// registration would say it: the rows of deploy/providers.txt for the library, in its order.
 #pragma once
 
 #include <string>
@@ -26,7 +26,7 @@ const ProviderInfo* associationProviderFor(std::string_view className);
 std::vector<const ProviderInfo*> associationProviders();
 
 /// The class the up-calls of the system-device provider ask for.
-inline constexpr const char* kComputerSystemClass = "KESTA_ComputerSystem";
+extern const char* const kComputerSystemClass;
 
 /// A class name the library knows, in its declared spelling (object managers hand providers the
 /// name as the class declares it, whatever case the client used); other names unchanged.

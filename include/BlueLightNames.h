@@ -1,6 +1,8 @@
 // Names that every unit of the module uses: the CIM classes it serves or meets, the provider
 // names given to the broker's trace facility, and small helpers for the namespace of a path.
-// Each unit that includes this header gets its own copies of the constants.
+// Each unit that includes this header gets its own copies of the constants. The class and
+// provider names are those of deploy/providers.txt (last in this header), so the module cannot
+// call a class or a provider other than the registrations do.
 #ifndef KESTA_BLUELIGHTNAMES_H
 #define KESTA_BLUELIGHTNAMES_H
 
@@ -8,20 +10,12 @@
 #include <cmpift.h>
 #include <cmpimacs.h>
 
+// Generated from deploy/providers.txt, which the registrations are generated from too.
+#include "ProviderTable.h"
+
 namespace Kesta {
 namespace BlueLightProvider {
 namespace {
-
-const char* const BlueLightClass = "KESTA_BlueLight";
-const char* const BlueLightCapabilitiesClass = "KESTA_BlueLightCapabilities";
-const char* const BlueLightElementCapabilitiesClass = "KESTA_BlueLightElementCapabilities";
-const char* const BlueLightSystemDeviceClass = "KESTA_BlueLightSystemDevice";
-const char* const ComputerSystemClass = "KESTA_ComputerSystem";
-
-const char* const BlueLightProfileProvider = "BlueLightProfileProvider";
-const char* const BlueLightCapabilitiesProvider = "BlueLightCapabilitiesProvider";
-const char* const BlueLightElementCapabilitiesProvider = "BlueLightElementCapabilitiesProvider";
-const char* const BlueLightSystemDeviceProvider = "BlueLightSystemDeviceProvider";
 
 // Levels of the broker's trace facility.
 constexpr int kBrokerTraceInfo = CMPI_LEV_INFO;
@@ -53,6 +47,21 @@ template <typename T>
 inline bool isUsable(const T* object) {
   return !CMIsNullObject(object);
 }
+
+// The class names, one constant for every class of deploy/providers.txt, named by its symbol
+// column: BlueLightClass, BlueLightCapabilitiesClass, BlueLightElementCapabilitiesClass,
+// BlueLightSystemDeviceClass and ComputerSystemClass ("KESTA_BlueLight", ...).
+#define KESTA_BLUELIGHT_CLASS_NAME(symbol, className) const char* const symbol = className;
+BLUELIGHT_TABLE_CLASSES(KESTA_BLUELIGHT_CLASS_NAME)
+#undef KESTA_BLUELIGHT_CLASS_NAME
+
+// The names of the module's providers, one constant each, named as the provider:
+// BlueLightProfileProvider, BlueLightCapabilitiesProvider, BlueLightElementCapabilitiesProvider
+// and BlueLightSystemDeviceProvider ("BlueLightProfileProvider", ...). They are the names the
+// registrations give the providers, and the prefixes of the factory functions.
+#define KESTA_BLUELIGHT_PROVIDER_NAME(symbol, provider) const char* const symbol = provider;
+BLUELIGHT_TABLE_PROVIDERS_bluelightprofileprovider(KESTA_BLUELIGHT_PROVIDER_NAME)
+#undef KESTA_BLUELIGHT_PROVIDER_NAME
 
 }  // namespace
 }  // namespace BlueLightProvider
