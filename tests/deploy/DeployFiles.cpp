@@ -57,6 +57,44 @@ std::string Registration::summary() const {
   return out.str();
 }
 
+std::string TableRow::summary() const {
+  Registration registration;
+  registration.className = className;
+  registration.provider = provider;
+  registration.location = library;
+  registration.kinds = kinds;
+  registration.namespaces = namespaces;
+  return registration.summary();
+}
+
+std::vector<TableRow> providerTable() {
+  const std::string table = std::string(BLUELIGHT_DEPLOY_SOURCE_DIR) + "/providers.txt";
+  std::istringstream in(readText(table));
+  std::vector<TableRow> rows;
+  int number = 0;
+  for (std::string line; std::getline(in, line);) {
+    ++number;
+    line = strip(line);
+    if (line.empty() || line.front() == '#') continue;
+    const std::vector<std::string> fields = words(line);
+    if (fields.size() != 6) {
+      throw std::runtime_error(table + ":" + std::to_string(number) + ": expected 6 columns");
+    }
+    TableRow row;
+    row.className = fields[0];
+    row.provider = fields[1];
+    const std::vector<std::string> kinds = splitList(fields[2]);
+    row.kinds.insert(kinds.begin(), kinds.end());
+    row.library = fields[3];
+    const std::vector<std::string> namespaces = splitList(fields[4]);
+    row.namespaces.insert(namespaces.begin(), namespaces.end());
+    row.symbol = fields[5];
+    row.line = number;
+    rows.push_back(std::move(row));
+  }
+  return rows;
+}
+
 std::vector<std::string> splitList(const std::string& text) {
   std::vector<std::string> items;
   std::istringstream in(text);

@@ -25,6 +25,24 @@ struct Registration {
   std::string summary() const;
 };
 
+// One row of the provider table, deploy/providers.txt, as it is written there.
+struct TableRow {
+  std::string className;
+  std::string provider;
+  std::set<std::string> kinds;  // "instance", "association"
+  std::string library;          // the CMake target, which is also the registered location
+  std::set<std::string> namespaces;
+  std::string symbol;  // the name of the C++ constant holding the class name
+  int line = 0;        // where it stands in the table, for messages
+
+  // The same form as Registration::summary(), to compare a row with what was generated from it.
+  std::string summary() const;
+};
+
+// The rows of the provider table, in its order. Throws std::runtime_error naming the line when a
+// row does not have the table's six columns.
+std::vector<TableRow> providerTable();
+
 // The registrations of every generated sfcb .reg file, in file order.
 std::vector<Registration> sfcbRegistrations();
 // The same from every generated OpenPegasus registration MOF; the module, provider and

@@ -1,17 +1,24 @@
 // The generated registrations against what they describe: the libraries and their exported MI
 // factories, the class MOF, and each other. A provider renamed in the module, a class renamed in
 // the MOF or a library renamed in the build fails here before any object manager sees it.
+//
+// The provider table is the one source of the registrations, of the module's class and provider
+// names and of the tool's provider map; each of them is checked against the table as written.
 #include <gtest/gtest.h>
 
 #include <filesystem>
 #include <map>
+#include <regex>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "BlueLightNames.h"
 #include "DeployFiles.h"
+#include "ProviderMap.h"
 #include "TestSupport.h"
 #include "cmpihost/cmpihost.h"
+#include "text/Text.h"
 
 namespace {
 
@@ -297,6 +304,96 @@ TEST_F(RegistrationTest, EveryRegisteredMiLoadsAndServesItsClass) {
       cmpihost::cleanup(broker, associationMI.mi);
     }
   }
+}
+
+// ---- The provider table and what is generated from it ---------------------------------------
+
+// The library of the module, the one the tool loads.
+const char* const kModuleLibrary = "bluelightprofileprovider";
+
+std::vector<deploy::TableRow> tableRows() {
+  std::vector<deploy::TableRow> rows;
+  EXPECT_NO_THROW(rows = deploy::providerTable());
+  EXPECT_FALSE(rows.empty()) << "deploy/providers.txt lists no provider";
+  return rows;
+}
+
+TEST(ProviderTableTest, TheRegistrationsAreTheTable) {
+  std::set<std::string> table;
+  for (const deploy::TableRow& row : tableRows()) table.insert(row.summary());
+  for (const auto& registrations : {deploy::sfcbRegistrations(), deploy::pegasusRegistrations()}) {
+    EXPECT_EQ(summaries(registrations), table);
+  }
+}
+
+// The symbols name C++ constants, so each must be an identifier, and a different one.
+TEST(ProviderTableTest, SymbolsAreDistinctIdentifiers) {
+  const std::regex identifier("[A-Za-z_][A-Za-z0-9_]*");
+  std::set<std::string> seen;
+  for (const deploy::TableRow& row : tableRows()) {
+    EXPECT_TRUE(std::regex_match(row.symbol, identifier))
+        << "line " << row.line << ": " << row.symbol;
+    EXPECT_TRUE(seen.insert(row.symbol).second) << "line " << row.line << ": " << row.symbol;
+  }
+}
+
+// Every class and provider name the module defines, against the row that names it. A name the
+// module has that the table lacks, or a value that differs, fails here.
+TEST(ProviderTableTest, TheModulesNamesAreTheTables) {
+  namespace names = Kesta::BlueLightProvider;
+  const std::map<std::string, std::string> moduleClasses = {
+      {"BlueLightClass", names::BlueLightClass},
+      {"BlueLightCapabilitiesClass", names::BlueLightCapabilitiesClass},
+      {"BlueLightElementCapabilitiesClass", names::BlueLightElementCapabilitiesClass},
+      {"BlueLightSystemDeviceClass", names::BlueLightSystemDeviceClass},
+      {"ComputerSystemClass", names::ComputerSystemClass}};
+  const std::set<std::string> moduleProviders = {
+      names::BlueLightProfileProvider, names::BlueLightCapabilitiesProvider,
+      names::BlueLightElementCapabilitiesProvider, names::BlueLightSystemDeviceProvider};
+
+  std::map<std::string, std::string> tableClasses;
+  std::set<std::string> tableProviders;
+  for (const deploy::TableRow& row : tableRows()) {
+    tableClasses[row.symbol] = row.className;
+    if (row.library == kModuleLibrary) tableProviders.insert(row.provider);
+  }
+  EXPECT_EQ(moduleClasses, tableClasses);
+  EXPECT_EQ(moduleProviders, tableProviders);
+}
+
+// The tool asks the module's providers in the table's order, knows which have association MIs,
+// and finds each class whatever its case.
+TEST(ProviderTableTest, TheToolsProviderMapIsTheTables) {
+  std::vector<std::string> table;
+  std::vector<std::string> associationTable;
+  std::string computerSystemClass;
+  for (const deploy::TableRow& row : tableRows()) {
+    if (row.symbol == "ComputerSystemClass") computerSystemClass = row.className;
+    if (row.library != kModuleLibrary) continue;
+    table.push_back(row.provider + " " + row.className);
+    if (row.kinds.count("association") == 1) associationTable.push_back(row.provider);
+  }
+
+  std::vector<std::string> tool;
+  for (const bluelight::cli::ProviderInfo& provider : bluelight::cli::allProviders()) {
+    tool.push_back(std::string(provider.name) + " " + provider.className);
+    const std::string lower = Kesta::platform::asciiLowerCopy(provider.className);
+    EXPECT_EQ(bluelight::cli::canonicalClassName(lower), provider.className);
+    EXPECT_EQ(bluelight::cli::instanceProviderFor(lower), &provider);
+  }
+  EXPECT_EQ(tool, table);
+
+  std::vector<std::string> toolAssociations;
+  for (const bluelight::cli::ProviderInfo* provider : bluelight::cli::associationProviders()) {
+    toolAssociations.push_back(provider->name);
+    EXPECT_EQ(bluelight::cli::associationProviderFor(provider->className), provider);
+  }
+  EXPECT_EQ(toolAssociations, associationTable);
+
+  EXPECT_EQ(bluelight::cli::kComputerSystemClass, computerSystemClass);
+  EXPECT_EQ(bluelight::cli::canonicalClassName(
+                Kesta::platform::asciiLowerCopy(bluelight::cli::kComputerSystemClass)),
+            computerSystemClass);
 }
 
 }  // namespace
