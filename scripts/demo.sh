@@ -8,7 +8,7 @@ scripts/ensure-packages.sh demo
 # Its own build folder without the tests, so that the demo builds only what it runs.
 build_dir="${BUILD_DIR:-build-demo}"
 cmake -S . -B "$build_dir" -DCMAKE_BUILD_TYPE="${BUILD_TYPE:-RelWithDebInfo}" \
-  -DBLUELIGHT_BUILD_TESTS=OFF >/dev/null
+  -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF >/dev/null
 cmake --build "$build_dir" -j "${JOBS:-$(nproc 2>/dev/null || echo 2)}" \
   --target bluelightprofileprovider bluelight-cli >/dev/null
 

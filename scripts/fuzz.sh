@@ -38,7 +38,7 @@ done
 
 echo "== configuring $build"
 CC=clang CXX=clang++ cmake -S "$root" -B "$build" -DCMAKE_BUILD_TYPE=Debug \
-  -DBLUELIGHT_FUZZ=ON -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_IPMI_LAN=OFF >/dev/null
+  -DBLUELIGHT_FUZZ=ON -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF -DBLUELIGHT_IPMI_LAN=OFF >/dev/null
 echo "== building ${targets[*]}"
 cmake --build "$build" --target "${targets[@]}" -j "$jobs"
 
@@ -64,7 +64,12 @@ for target in "${targets[@]}"; do
   run="$work/$target"
   rm -rf "$run"
   mkdir -p "$run/corpus" "$run/artifacts"
-  cp "$seeds"/* "$run/corpus/" 2>/dev/null || true
+  # A target without its seed corpus would start from nothing and prove little: that is an error.
+  if ! compgen -G "$seeds/*" >/dev/null; then
+    echo "== $target: no seed corpus in $seeds" >&2
+    exit 2
+  fi
+  cp "$seeds"/* "$run/corpus/"
 
   # Inputs that crashed once must not crash again.
   for input in "$root/fuzz/regressions/$target"/*; do

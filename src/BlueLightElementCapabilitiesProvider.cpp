@@ -41,6 +41,15 @@ const char* classNameOf(const CMPIObjectPath* path, CMPIStatus* status) {
   return name != nullptr ? CMGetCharPtr(name) : nullptr;
 }
 
+// Whether the source of an association walk is one of the two ends, by its class alone. Only
+// asked when no association class came and no far end was found, so that a request naming this
+// association meets no additional broker call.
+bool startsThisAssociation(const CMPIObjectPath* source) {
+  if (!isUsable(source)) return false;
+  const char* className = classNameOf(source, nullptr);
+  return isLightClass(className) || isCapabilitiesClass(className);
+}
+
 }  // namespace
 
 // One association instance for every (light, capabilities record) pair, in the namespace of
@@ -297,12 +306,21 @@ CMPIStatus BlueLightElementCapabilities_Associators(CMPIAssociationMI* mi, const
   std::vector<CMPIInstance*> instances;
   instances.reserve(factory.getNumberOfInstances());
 
-  // Object managers pass a null association class when the client named none; they only ask
-  // the providers of associations that can apply, so the client meant this one.
+  // Object managers pass a null association class when the client named none. From one of the
+  // ends that can only mean this association. Some object managers send it to every association
+  // provider of the namespace, whatever the source: where this association does not start,
+  // there is nothing to add, and a failure here would fail the whole request, the other
+  // providers' answers included. So that case ends with success and nothing, as an operation
+  // that found nothing does.
   CMPIObjectPath* targetPath = factory.get_assoc_targetClass_ObjectPath(
       mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass, resultClass,
       &status);
   if (CMIsNullObject(targetPath)) {
+    if (assocClass == nullptr && !startsThisAssociation(ref)) {
+      KESTA_TRACE_PARA(loggerBlueLightElementCapabilitiesProvider, kTraceLevel, EXITING,
+                       parameters);
+      return okStatus();
+    }
     const char* const text = "Object Path is NULL in Associators.";
     reportFailure(mb, BlueLightElementCapabilitiesProvider, &status, text, text);
     return status;
@@ -346,6 +364,13 @@ CMPIStatus BlueLightElementCapabilities_AssociatorNames(
       mb, ref, assocClass != nullptr ? assocClass : BlueLightElementCapabilitiesClass, resultClass,
       &status);
   if (CMIsNullObject(targetPath)) {
+    // As in Associators: a null association class from a source where this association does not
+    // start gets nothing, with success.
+    if (assocClass == nullptr && !startsThisAssociation(ref)) {
+      KESTA_TRACE_PARA(loggerBlueLightElementCapabilitiesProvider, kTraceLevel, EXITING,
+                       parameters);
+      return okStatus();
+    }
     // "AssociatorsNames" is the operation's own long-standing spelling.
     const char* const text = "Object Path is NULL in AssociatorsNames.";
     reportFailure(mb, BlueLightElementCapabilitiesProvider, &status, text, text);

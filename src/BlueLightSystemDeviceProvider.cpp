@@ -46,6 +46,15 @@ bool sameClass(const char* className, const char* expected) {
   return className != nullptr && std::strcmp(className, expected) == 0;
 }
 
+// Whether the source of an association walk is one of the two ends, by its class alone. Only
+// asked when no association class came and no far end was found, so that a request naming this
+// association meets no additional broker call.
+bool startsThisAssociation(const CMPIObjectPath* source) {
+  if (!isUsable(source)) return false;
+  const char* className = classNameOf(source, nullptr);
+  return sameClass(className, ComputerSystemClass) || sameClass(className, BlueLightClass);
+}
+
 // Whether a result class named by the client admits the target class: either of two names, in
 // any letter case. A null result class admits everything.
 bool acceptsResultClass(const char* resultClass, const char* servedName, const char* schemaName) {
@@ -281,7 +290,8 @@ namespace {
 // Associators and AssociatorNames: the other end of every association from `ref`, as instances
 // or, with `namesOnly`, as object paths. All calls use a status of their own, which becomes the
 // operation's status at the end and on the failure returns. A request this association does not
-// serve, or whose result class does not fit, ends silently with success.
+// serve, or whose result class does not fit, ends silently with success; only a null association
+// class from a source where this association does not start also asks for the exit line.
 CMPIStatus associatedObjects(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIResult* result,
                              const CMPIObjectPath* ref, const char* assocClass,
                              const char* resultClass, const char** properties, bool namesOnly,
@@ -290,12 +300,18 @@ CMPIStatus associatedObjects(const CMPIBroker* mb, const CMPIContext* ctx, const
   traceExit = false;
 
   BlueLightFactory factory(true, false);
-  // Object managers pass a null association class when the client named none; they only ask
-  // the providers of associations that can apply, so the client meant this one.
+  // Object managers pass a null association class when the client named none. From one of the
+  // ends that can only mean this association. Some object managers send it to every association
+  // provider of the namespace, whatever the source: where this association does not start, the
+  // answer is nothing, with success, and it is logged as any operation that found nothing, so
+  // that both association providers answer such a request alike.
   CMPIObjectPath* targetPath = factory.get_assoc_targetClass_ObjectPath(
       mb, ref, assocClass != nullptr ? assocClass : BlueLightSystemDeviceClass, resultClass,
       &localStatus);
-  if (CMIsNullObject(targetPath)) return okStatus();
+  if (CMIsNullObject(targetPath)) {
+    traceExit = assocClass == nullptr && !startsThisAssociation(ref);
+    return okStatus();
+  }
 
   const char* targetClass = classNameOf(targetPath, &localStatus);
   if (sameClass(targetClass, ComputerSystemClass)) {

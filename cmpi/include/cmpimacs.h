@@ -15,8 +15,10 @@
  *    how provider code expects them; "if (x) CMReturn(rc); else ..." does not compile.
  *  - CMPI_INLINE (typed inline functions instead of macros) and DOC_ONLY are not supported; the
  *    macros are used regardless of those switches.
- *  - The C++ factory macros (CM*MIFactory, CMProviderBase) are left out: they need a C++ class
- *    library that is not part of these headers.
+ *  - The C++ factory macros (CM*MIFactory, CMProviderBase) refer to the classes of a separate
+ *    C++ provider library (CmpiBaseMI, CmpiInstanceMI, ..., CmpiProviderBase) that these headers
+ *    do not declare. They are defined in C too, so that #ifdef tests see the same set of names
+ *    in both languages, but they only compile when expanded in C++ next to that library.
  */
 #ifndef _CMPIMACS_H_
 #define _CMPIMACS_H_
@@ -489,6 +491,138 @@
     broker = brkr;                                                                       \
     hook;                                                                                \
     return &mi;                                                                          \
+  }
+
+/* ------------------------------------------------------------------------------------------- */
+/* MI factories for C++ providers                                                              */
+/* ------------------------------------------------------------------------------------------- */
+
+/*
+ * The C++ counterpart of the stubs: the provider is a class cn derived from the MI classes of the
+ * C++ provider library, and the tables are filled with that library's static drive functions,
+ * which reach the provider object through the record's hdl. Each factory keeps its table and MI
+ * record as static locals, so factories of every kind and for several provider names can share
+ * one translation unit. miName is "<kind>" #pn with the kind in lower case, also "indication".
+ *
+ * One provider object serves all MI kinds registered under the same provider name pn: it is kept
+ * in the CmpiProviderBase object base<pn> that CMProviderBase(pn) defines (once, before the
+ * factories that use it). The first factory call creates it with the broker and the calling
+ * context and initialises it; every call, the first included, counts one more user of it. Like
+ * the stubs, the factories never write *rc.
+ */
+
+#define CMProviderBase(pn) CmpiProviderBase base##pn;
+
+/*
+ * Creates the provider object on the first call and registers one more user of it. cn is only
+ * named here, so provider classes need the (CmpiBroker, CmpiContext) constructor, initialize()
+ * and setProviderBase() of the library's CmpiBaseMI.
+ */
+#define CMProviderFactoryBody_(cn, pn, mi)                   \
+  CmpiContext ctx((CMPIContext*)ctxp);                       \
+  CmpiBaseMI* provider = base##pn.getBaseMI();               \
+  (void)rc;                                                  \
+  if (provider == 0) {                                       \
+    provider = new cn(CmpiBroker((CMPIBroker*)broker), ctx); \
+    provider->setProviderBase(&base##pn);                    \
+    provider->initialize(ctx);                               \
+    base##pn.setBaseMI(provider);                            \
+  }                                                          \
+  (mi).hdl = provider;                                       \
+  base##pn.incUseCount();                                    \
+  return &(mi);
+
+/*
+ * The cleanup drive function is shared by every MI kind, so it takes the record as a plain
+ * pointer and is cast to each table's cleanup type. The modifyInstance slot is served by the
+ * library's driveSetInstance, the name the older levels gave that slot.
+ */
+#define CMInstanceMIFactory(cn, pn)                                                               \
+  CMPI_EXTERN_C CMPIInstanceMI* pn##_Create_InstanceMI(const CMPIBroker* broker,                  \
+                                                       const CMPIContext* ctxp, CMPIStatus* rc) { \
+    static CMPIInstanceMIFT instMIFT = {CMPICurrentVersion,                                       \
+                                        CMPICurrentVersion,                                       \
+                                        "instance" #pn,                                           \
+                                        (CMPIStatus(*)(CMPIInstanceMI*, const CMPIContext*,       \
+                                                       CMPIBoolean))CmpiBaseMI::driveBaseCleanup, \
+                                        CmpiInstanceMI::driveEnumInstanceNames,                   \
+                                        CmpiInstanceMI::driveEnumInstances,                       \
+                                        CmpiInstanceMI::driveGetInstance,                         \
+                                        CmpiInstanceMI::driveCreateInstance,                      \
+                                        CmpiInstanceMI::driveSetInstance,                         \
+                                        CmpiInstanceMI::driveDeleteInstance,                      \
+                                        CmpiInstanceMI::driveExecQuery};                          \
+    static CMPIInstanceMI mi = {NULL, &instMIFT};                                                 \
+    CMProviderFactoryBody_(cn, pn, mi)                                                            \
+  }
+
+#define CMAssociationMIFactory(cn, pn)                                     \
+  CMPI_EXTERN_C CMPIAssociationMI* pn##_Create_AssociationMI(              \
+      const CMPIBroker* broker, const CMPIContext* ctxp, CMPIStatus* rc) { \
+    static CMPIAssociationMIFT assocMIFT = {                               \
+        CMPICurrentVersion,                                                \
+        CMPICurrentVersion,                                                \
+        "association" #pn,                                                 \
+        (CMPIStatus(*)(CMPIAssociationMI*, const CMPIContext*,             \
+                       CMPIBoolean))CmpiBaseMI::driveBaseCleanup,          \
+        CmpiAssociationMI::driveAssociators,                               \
+        CmpiAssociationMI::driveAssociatorNames,                           \
+        CmpiAssociationMI::driveReferences,                                \
+        CmpiAssociationMI::driveReferenceNames};                           \
+    static CMPIAssociationMI mi = {NULL, &assocMIFT};                      \
+    CMProviderFactoryBody_(cn, pn, mi)                                     \
+  }
+
+#define CMMethodMIFactory(cn, pn)                                                               \
+  CMPI_EXTERN_C CMPIMethodMI* pn##_Create_MethodMI(const CMPIBroker* broker,                    \
+                                                   const CMPIContext* ctxp, CMPIStatus* rc) {   \
+    static CMPIMethodMIFT methMIFT = {CMPICurrentVersion, CMPICurrentVersion, "method" #pn,     \
+                                      (CMPIStatus(*)(CMPIMethodMI*, const CMPIContext*,         \
+                                                     CMPIBoolean))CmpiBaseMI::driveBaseCleanup, \
+                                      CmpiMethodMI::driveInvokeMethod};                         \
+    static CMPIMethodMI mi = {NULL, &methMIFT};                                                 \
+    CMProviderFactoryBody_(cn, pn, mi)                                                          \
+  }
+
+/* As with the stub, the 2.0 slot setPropertyWithOrigin is left NULL. */
+#define CMPropertyMIFactory(cn, pn)                                                               \
+  CMPI_EXTERN_C CMPIPropertyMI* pn##_Create_PropertyMI(const CMPIBroker* broker,                  \
+                                                       const CMPIContext* ctxp, CMPIStatus* rc) { \
+    static CMPIPropertyMIFT propMIFT = {                                                          \
+        CMPICurrentVersion,                                                                       \
+        CMPICurrentVersion,                                                                       \
+        "property" #pn,                                                                           \
+        (CMPIStatus(*)(CMPIPropertyMI*, const CMPIContext*,                                       \
+                       CMPIBoolean))CmpiBaseMI::driveBaseCleanup,                                 \
+        CmpiPropertyMI::driveSetProperty,                                                         \
+        CmpiPropertyMI::driveGetProperty CMPropertyMIStubExtensions_};                            \
+    static CMPIPropertyMI mi = {NULL, &propMIFT};                                                 \
+    CMProviderFactoryBody_(cn, pn, mi)                                                            \
+  }
+
+#ifdef CMPI_VER_86
+#define CMIndicationMIFactoryExtensions \
+  CmpiIndicationMI::driveEnableIndications, CmpiIndicationMI::driveDisableIndications,
+#else
+#define CMIndicationMIFactoryExtensions
+#endif
+
+/* Unlike the stub, the factory writes "indication" in lower case into miName. */
+#define CMIndicationMIFactory(cn, pn)                                                              \
+  CMPI_EXTERN_C CMPIIndicationMI* pn##_Create_IndicationMI(                                        \
+      const CMPIBroker* broker, const CMPIContext* ctxp, CMPIStatus* rc) {                         \
+    static CMPIIndicationMIFT indMIFT = {CMPICurrentVersion,                                       \
+                                         CMPICurrentVersion,                                       \
+                                         "indication" #pn,                                         \
+                                         (CMPIStatus(*)(CMPIIndicationMI*, const CMPIContext*,     \
+                                                        CMPIBoolean))CmpiBaseMI::driveBaseCleanup, \
+                                         CmpiIndicationMI::driveAuthorizeFilter,                   \
+                                         CmpiIndicationMI::driveMustPoll,                          \
+                                         CmpiIndicationMI::driveActivateFilter,                    \
+                                         CmpiIndicationMI::driveDeActivateFilter,                  \
+                                         CMIndicationMIFactoryExtensions};                         \
+    static CMPIIndicationMI mi = {NULL, &indMIFT};                                                 \
+    CMProviderFactoryBody_(cn, pn, mi)                                                             \
   }
 
 #endif /* _CMPIMACS_H_ */

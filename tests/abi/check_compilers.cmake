@@ -1,6 +1,6 @@
 # Compiles the header checks with every C and C++ compiler found at configure time (not only the
 # one the build uses), because providers and brokers using our headers may be built with either
-# GCC or Clang. Runs the C check program each compiler produces.
+# GCC or Clang. Runs the C check program and the C++ factory test each compiler produces.
 #
 # Called by CTest as:
 #   cmake -DSOURCE_DIR=... -DINCLUDE_DIR=... -DWORK_DIR=... -DC_COMPILERS=a,b -DCXX_COMPILERS=c,d
@@ -50,6 +50,10 @@ foreach(cxx IN LISTS CXX_COMPILERS)
          ${SOURCE_DIR}/abi_static_checks.cpp)
     _run("${name} -std=${std} stub provider" ${cxx} -std=${std} ${_common} -fsyntax-only
          ${SOURCE_DIR}/abi_stub_provider_cxx.cpp)
+    set(exe ${WORK_DIR}/abi_factory_test_${name}_${std})
+    _run("${name} -std=${std} abi_factory_test.cpp" ${cxx} -std=${std} ${_common}
+         -fvisibility=hidden -rdynamic ${SOURCE_DIR}/abi_factory_test.cpp -o ${exe} -ldl)
+    _run("${name} -std=${std} factory run" ${exe})
     math(EXPR _ran "${_ran} + 1")
   endforeach()
 endforeach()

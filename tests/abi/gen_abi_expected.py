@@ -6,7 +6,10 @@ tables and writes two include files next to itself, which are committed with the
 
   abi_expected.inc      one X-macro row per fact (ABI_SCALAR, ABI_STRUCT, ABI_MEMBER, ...); the
                         C and C++ test sources define the row macros they need and include it
-  abi_macro_checks.inc  preprocessor checks: every constant is a macro, no enumerator is one
+  abi_macro_checks.inc  preprocessor checks: every constant is a macro, every other macro the
+                        notes name for a default build is defined (function-like ones such as
+                        CMGetProperty and the MI stub and factory macros included), and no
+                        enumerator is a macro
 
 The test never reads the notes itself; rerun this script when the notes change:
 
@@ -15,7 +18,10 @@ The test never reads the notes itself; rerun this script when the notes change:
 The script cross-checks what it reads (slot numbers in order, members that neither overlap nor
 fail to add up to the struct size, decimal against hex values, the "sizeof(...) = N" sentences
 against the size table) and stops on any inconsistency, so that a mistake in the notes or in the
-parsing does not end up as an expected value.
+parsing does not end up as an expected value. Macro names are taken from every backticked name in
+the notes, tables and running text alike; each one must turn out to be a type, a tag, an
+enumerator, a constant, a macro of the default build or one of the names in NOT_DEFINED, and the
+script stops on a name it cannot place.
 """
 
 import os
@@ -27,6 +33,39 @@ HERE = os.path.dirname(os.path.abspath(__file__))
 C_WORDS = {
     "const", "volatile", "unsigned", "signed", "short", "long", "int", "char", "void", "float",
     "double", "struct", "union", "enum", "size_t", "pthread_key_t",
+}
+
+
+# Backticked names that may be macros. Types, tags and enumerators share these prefixes; they are
+# recognised from the tables and sorted out.
+MACRO_CANDIDATE = re.compile(r"^(CM|CB|CD|_CMPI)\w*$")
+
+# Names the notes mention that a 2.0 header set does not define in a default build, and why. A
+# name listed here that the notes no longer mention stops the script, so the list stays current.
+NOT_DEFINED = {
+    "CMPI_VERSION": "set by a provider build to choose the level, never by the headers",
+    "CMPI_VER_ALL": "set by a build to choose every level, never by the headers",
+    "CMPI_INLINE": "a build switch (inline functions instead of macros), not set by the headers",
+    "CMPI_NO_INLINE": "not read by the headers at all",
+    "CMPI_NO_SYNONYM_SUPPORT": "a build switch that removes the synonyms of the type codes",
+    "CMBrokerVersion": "appears only in a comment; the broker-version macro is CBBrokerVersion",
+    "CMEvaluatePredicate": "exists for the levels 0.87 to 0.9x only",
+    "CBSetInstance": "what CBModifyInstance turns into in a 1.0 build",
+    "CMPI_SEV_DEBUG": "a misspelling the notes warn about; the enumerator is CMPI_DEV_DEBUG",
+    "CMPI_String": "a misspelt type code used by CMFmtString; the code is CMPI_string",
+    "CMPI_VER_x": "stands for the CMPI_VER_<level> switches, which are listed one by one",
+    "CMFmtX": "stands for the CMFmt<type> helpers, which are listed one by one",
+    "CMFmtArgsN": "stands for CMFmtArgs0 to CMFmtArgs10, expanded from the stated range",
+}
+# Set by the build (exactly one of them); our cmpipl.h picks the Linux one when none is given.
+NOT_DEFINED_PREFIX = ("CMPI_PLATFORM_", "set by the build to name the platform")
+
+# Macros of a default build that the notes leave unnamed, and why they are checked anyway.
+EXTRA_MACROS = {
+    "CMIndicationMIFactoryExtensions": (
+        "object", "the two CMPI_VER_86 entries of CMIndicationMIFactory, the factory's "
+        "counterpart of CMIndicationMIStubExtensions; the notes describe the factory macros only "
+        "as a group and do not name this helper"),
 }
 
 
@@ -94,6 +133,9 @@ class Collector:
         self.members = []        # (struct, member, off, size, kind, type)
         self.stated_sizes = {}   # from "sizeof(X) = **N**" sentences
         self.handle_sizes = {}   # from the sizeof column of the handle tables
+        self.macros = {}         # name -> [kind ("function" or "object"), heading]; see macros()
+        self.left_out = {}       # names mentioned but not defined in a default build -> reason
+        self.headings = [""]     # every heading in document order, for grouping the macros
 
     def member(self, struct, member, off, size, kind, typ):
         for s, m, *_ in self.members:
@@ -137,6 +179,128 @@ def parse(path):
             i += 1
         handle_table(c, header, rows, heading, context)
     return c
+
+
+def title(heading):
+    """'### 9.5 Factory services (`CMPIBrokerEncFT`)' -> 'Factory services (CMPIBrokerEncFT)'"""
+    return re.sub(r"^#+\s*[\d.]*\s*", "", heading).replace("`", "")
+
+
+def macros(path, c):
+    """Collects every macro the notes name for a default build into c.macros.
+
+    Each backticked name that looks like a CMPI macro must be placed: a type (scalar, struct,
+    the further typedefs, an enum), a tag, an enumerator, a constant or context entry name
+    (already checked on their own), a name in NOT_DEFINED, or otherwise a macro. A macro's group
+    is the heading of the table row that describes it, else of its first mention. Families given
+    as XxxN(...) with a stated range "`N` runs from a ... to b" are expanded.
+    """
+    with open(path, encoding="utf-8") as f:
+        lines = f.read().splitlines()
+
+    types = {x[0] for x in c.scalars} | set(c.structs) | {e for e, n, v in c.enumerators}
+    enumerators = {n for e, n, v in c.enumerators}
+    checked = {x[0] for x in c.constants} | {x[0] for x in c.strings}
+    guards = set()
+    described = {}  # name -> heading of the table row that describes it
+    mentioned = {}  # name -> heading of its first mention
+    function_like = set()
+    guard_text = {}  # name -> guard column of its row
+    intro = {}  # names mentioned before the first section
+
+    heading = ""
+    header = None
+    for line in lines:
+        if line.startswith("#"):
+            heading = line
+            c.headings.append(heading)
+        if line.startswith("|"):
+            row = cells(line)
+            if line.startswith("|---"):
+                continue  # the separator under the header (no backticked names)
+            if header is None:
+                header = [x.lower() for x in row]
+            else:
+                first = ticked(row[0])
+                if header[:2] == ["typedef", "what it is"] and first:
+                    types.add(first[0])
+                if "include guard" in header:
+                    guards.update(ticked(row[header.index("include guard")]))
+                if first and (header[0].startswith("macro") or header[0] == "helper"):
+                    m = re.match(r"^(\w+)", first[0])
+                    if m:
+                        described.setdefault(m.group(1), heading)
+                        for k, col in enumerate(header):
+                            if col.startswith("guard") and k < len(row):
+                                guard_text[m.group(1)] = row[k]
+        else:
+            header = None
+        # A whole backticked text that is a name, or a macro call such as `CMGetProperty(inst,
+        # name, rc)`. Patterns (`CM*MIStub`) and declarations are not names.
+        for t in ticked(line):
+            m = re.match(r"^(\w+)(\([^()]*\))?$", t.strip())
+            if not m or not (MACRO_CANDIDATE.match(m.group(1)) or m.group(1) in guards):
+                continue
+            # The introduction only previews names; group them where they are explained.
+            if heading.startswith("## ") or heading.startswith("### "):
+                mentioned.setdefault(m.group(1), heading)
+            else:
+                intro.setdefault(m.group(1), heading)
+            if m.group(2):
+                function_like.add(m.group(1))
+    for name, h in intro.items():
+        mentioned.setdefault(name, h)
+
+    # Families such as CMFmtArgsN(...), expanded with the range stated in a paragraph that names
+    # the family (other mentions, in tables for instance, need not repeat the range).
+    text = "\n".join(lines)
+    families = set(re.findall(r"`(\w+)N\([^`]*\)`", text))
+    heading = ""
+    for para in re.split(r"\n\s*\n", text):
+        for line in para.splitlines():
+            if line.startswith("#"):
+                heading = line
+        r = re.search(r"`N` runs from (\d+)\b.*?\bto (\d+)\b", para, re.S)
+        for fam in re.findall(r"`(\w+)N\([^`]*\)`", para) if r else []:
+            families.discard(fam)
+            for n in range(int(r.group(1)), int(r.group(2)) + 1):
+                name = "%s%d" % (fam, n)
+                described.setdefault(name, heading)
+                mentioned.setdefault(name, heading)
+                function_like.add(name)
+    if families:
+        fail("no range stated for the family %sN" % sorted(families)[0])
+
+    for name in NOT_DEFINED:
+        if name not in mentioned:
+            fail("NOT_DEFINED lists %s, which the notes do not mention" % name)
+    for name in EXTRA_MACROS:
+        if name in mentioned:
+            fail("EXTRA_MACROS lists %s, which the notes name themselves" % name)
+
+    for name, heading in mentioned.items():
+        if name in NOT_DEFINED:
+            c.left_out[name] = NOT_DEFINED[name]
+        elif name.startswith(NOT_DEFINED_PREFIX[0]):
+            c.left_out[name] = NOT_DEFINED_PREFIX[1]
+        elif name in types or name in enumerators or name in checked:
+            continue
+        elif name.startswith("_CMPI") and name not in guards:
+            continue  # struct, union or enum tag
+        else:
+            guard = guard_text.get(name, "").split(";")[0]
+            if re.search(r"\bnot\b", guard):
+                fail("%s is guarded by %r; decide whether a default build has it" % (name, guard))
+            kind = "function" if name in function_like else "object"
+            c.macros[name] = [kind, described.get(name, heading)]
+    for name, (kind, _) in EXTRA_MACROS.items():
+        c.macros[name] = [kind, None]
+
+    # Wildcards such as CM*MIStub must match names found.
+    for t in re.findall(r"`(CM\*\w+)`", text):
+        pat = re.compile("^" + t.replace("*", "\\w*") + "$")
+        if not any(pat.match(n) for n in c.macros):
+            fail("no macro matches %s" % t)
 
 
 def heading_type(heading):
@@ -368,8 +532,10 @@ def write(c):
     out = []
     w = out.append
     w("/*")
-    w(" * Preprocessor checks of the CMPI 2.0 headers: every constant is an object-like macro and")
-    w(" * no enumerator is a macro. Generated by gen_abi_expected.py; do not edit by hand.")
+    w(" * Preprocessor checks of the CMPI 2.0 headers: every constant is an object-like macro,")
+    w(" * no enumerator is a macro, and every other macro of a default build is defined, the")
+    w(" * function-like ones and the C++ factory macros included (those are defined in C too).")
+    w(" * Generated by gen_abi_expected.py; do not edit by hand.")
     w(" */")
     for name, value, sec in c.constants:
         w("#ifndef %s" % name)
@@ -383,6 +549,22 @@ def write(c):
         w("#ifdef %s" % n)
         w('#error "%s must be an enumerator, not a macro"' % n)
         w("#endif")
+    w("")
+    w("/* Every other macro named for a default build, grouped by where it is described */")
+    groups = c.headings + [None]
+    for g in groups:
+        names = [n for n, (kind, h) in c.macros.items() if h == g]
+        if not names:
+            continue
+        if g is None:
+            w("/* Not named in the notes: %s */" % ", ".join(names))
+        else:
+            w("/* %s */" % title(g))
+        for n in names:
+            kind = c.macros[n][0]
+            w("#ifndef %s" % n)
+            w('#error "%s is not defined (%s-like macro)"' % (n, kind))
+            w("#endif")
     with open(os.path.join(HERE, "abi_macro_checks.inc"), "w", encoding="utf-8") as f:
         f.write("\n".join(out) + "\n")
 
@@ -391,6 +573,7 @@ def main():
     if len(sys.argv) != 2:
         sys.exit("usage: gen_abi_expected.py path/to/cmpi-2.0-reference.md")
     c = parse(sys.argv[1])
+    macros(sys.argv[1], c)
     cross_check(c)
     write(c)
     fn = sum(1 for x in c.members if x[4] == "fn")
@@ -398,6 +581,13 @@ def main():
           "constants %d, enumerators %d, strings %d" % (
               len(c.scalars), len(c.os_macros), len(c.structs), len(c.members), fn,
               len(c.constants), len(c.enumerators), len(c.strings)))
+    fl = sum(1 for k, h in c.macros.values() if k == "function")
+    print("other macros %d (function-like %d, object-like %d; %d not named in the notes: %s); "
+          "macros checked in all %d" % (
+              len(c.macros), fl, len(c.macros) - fl, len(EXTRA_MACROS), ", ".join(EXTRA_MACROS),
+              len(c.macros) + len(c.constants) + len(c.strings)))
+    for name, why in c.left_out.items():
+        print("  not checked: %s: %s" % (name, why))
 
 
 if __name__ == "__main__":

@@ -169,6 +169,18 @@ class ElementCapabilitiesAssociationTest : public blackbox::BlackboxTest {
     return lines;
   }
 
+  // Every entry and exit line of the factory's target resolution, in order.
+  std::vector<std::string> targetResolutionLines() const {
+    std::vector<std::string> lines;
+    for (const std::string& line : log(kFactoryCategory, "LOG")) {
+      if (line.rfind("ENTERING: get_assoc_targetClass_", 0) == 0 ||
+          line.rfind("EXITING: get_assoc_targetClass_", 0) == 0) {
+        lines.push_back(line);
+      }
+    }
+    return lines;
+  }
+
   static std::size_t callCount(const Outcome& outcome, const std::string& table,
                                const std::string& function) {
     return static_cast<std::size_t>(std::count_if(
@@ -487,20 +499,30 @@ TEST_F(ElementCapabilitiesAssociationTest, ATargetPathThatLostItsHandleCountsAsN
 }
 
 // ---------------------------------------------------------------------------------------------
-// A NULL association class: object managers send one when the client named none.
+// A NULL association class: object managers send one when the client named none, some of them
+// to every association provider of the namespace whatever the source.
 // ---------------------------------------------------------------------------------------------
+
+// The operation's own lines show the argument as it came: the list stops after its key.
+const std::string kNullClassList = kStart + " _RefLeftClass=";
+// The target resolution is asked with the association's own class and no result class.
+const std::string kAskedWithOwnClass =
+    " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightElementCapabilities _RefRightClass=";
 
 TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromALightActsAsTheOwnClass) {
   useTree({blueLight("1"), blueLight("2")});
   const Outcome named = associators(lightPath("Blue Light:1"), kAssocClass);
   clearLog();
   const Outcome unnamed = associators(lightPath("Blue Light:1"), std::nullopt);
+  EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(unnamed.status, named.status);
   EXPECT_EQ(unnamed.results.size(), named.results.size());
+  EXPECT_EQ(blackbox::handOverKinds(unnamed), std::vector<std::string>{"Instance Valid"});
   EXPECT_EQ(unnamed.instances(), named.instances());
   EXPECT_EQ(unnamed.instances(), std::vector<InstanceValue>{capabilitiesInstance()});
   EXPECT_EQ(unnamed.doneCount, 0u);
   EXPECT_EQ(traces(unnamed), traces(named));
+  EXPECT_EQ(traces(unnamed), std::vector<std::string>{kToCapabilities});
   // The operation's own lines show the argument as it came: the list stops after its key.
   const std::string list = kStart + " _RefLeftClass=";
   expectLines({entering(kAssociators, kFile, list), exiting(kAssociators, kFile, list)});
@@ -521,28 +543,50 @@ TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromTheCapabilitiesActs
   EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(unnamed.status, named.status);
   EXPECT_EQ(unnamed.instances(), named.instances());
+  EXPECT_EQ(blackbox::handOverKinds(unnamed),
+            (std::vector<std::string>{"Instance Valid", "Instance Valid"}));
   EXPECT_EQ(instancePaths(unnamed),
             (std::vector<ObjectPathValue>{lightRef("Blue Light:1"), lightRef("Blue Light:2")}));
+  for (const InstanceValue& light : unnamed.instances()) {
+    EXPECT_EQ(light.className(), kLightClass);
+    EXPECT_EQ(light.propertyCount(), 15u) << light;
+  }
   EXPECT_EQ(unnamed.doneCount, 0u);
   EXPECT_EQ(traces(unnamed), traces(named));
+  EXPECT_EQ(traces(unnamed), std::vector<std::string>{kToLights});
   const std::string list = kStart + " _RefLeftClass=";
   expectLines({entering(kAssociators, kFile, list), exiting(kAssociators, kFile, list)});
 }
 
-TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromAComputerSystemFailsAsTheOwnClass) {
-  // This association does not start at a computer system: with or without a class the answer
-  // is the no-target failure.
+// This association does not start at a computer system. Named, it is the no-target failure;
+// unnamed, the request is one that every association provider gets, and this one has nothing to
+// add: success, nothing handed over, no warning, the entry and the exit line.
+TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromAComputerSystemGivesNothing) {
   useTree({blueLight("1")});
+  const std::string text = "Object Path is NULL in Associators.";
   const Outcome named = associators(computerSystemPath(kSystemName), kAssocClass);
+  EXPECT_EQ(named.status, StatusValue(CMPI_RC_ERR_FAILED, text));
+  EXPECT_TRUE(named.results.empty());
+  EXPECT_EQ(named.doneCount, 0u);
+  EXPECT_EQ(traces(named), std::vector<std::string>{warning(text)});
+  expectLines(
+      {entering(kAssociators, kFile,
+                associatorsList(kAssocClass, std::nullopt, std::nullopt, std::nullopt, "0"))});
+
   clearLog();
   const Outcome unnamed = associators(computerSystemPath(kSystemName), std::nullopt);
-  const std::string text = "Object Path is NULL in Associators.";
-  EXPECT_EQ(named.status, StatusValue(CMPI_RC_ERR_FAILED, text));
-  EXPECT_EQ(unnamed.status, named.status);
+  EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_TRUE(unnamed.results.empty());
-  EXPECT_EQ(traces(unnamed), traces(named));
-  EXPECT_EQ(traces(unnamed), std::vector<std::string>{warning(text)});
-  expectLines({entering(kAssociators, kFile, kStart + " _RefLeftClass=")});
+  EXPECT_EQ(unnamed.doneCount, 0u);
+  EXPECT_TRUE(traces(unnamed).empty());
+  expectLines({entering(kAssociators, kFile, kNullClassList),
+               exiting(kAssociators, kFile, kNullClassList)});
+  // The resolution is still asked with the association's own class and finds no far end.
+  EXPECT_EQ(targetResolutionLines(),
+            (std::vector<std::string>{
+                entering("get_assoc_targetClass_ObjectPath", kFactoryFile, kAskedWithOwnClass),
+                entering("get_assoc_targetClass_Name", kFactoryFile, kAskedWithOwnClass),
+                exiting("get_assoc_targetClass_ObjectPath", kFactoryFile, kAskedWithOwnClass)}));
 }
 
 TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassNamesFromALightActAsTheOwnClass) {
@@ -553,39 +597,115 @@ TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassNamesFromALightActAsThe
   EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(unnamed.status, named.status);
   EXPECT_EQ(unnamed.paths(), named.paths());
+  EXPECT_EQ(blackbox::handOverKinds(unnamed), std::vector<std::string>{"ObjectPath Valid"});
   EXPECT_EQ(unnamed.paths(), std::vector<ObjectPathValue>{capabilitiesRef()});
   EXPECT_EQ(unnamed.doneCount, 0u);
   EXPECT_EQ(traces(unnamed), traces(named));
+  EXPECT_EQ(traces(unnamed), std::vector<std::string>{kToCapabilities});
   const std::string list = kStart + " _RefLeftClass=";
   expectLines({entering(kAssociatorNames, kFile, list), exiting(kAssociatorNames, kFile, list)});
 }
 
-TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassNamesFromTheCapabilitiesActAsTheOwnClass) {
+TEST_F(ElementCapabilitiesAssociationTest,
+       NullAssocClassNamesFromTheCapabilitiesActsAsTheOwnClass) {
   useTree({blueLight("1"), blueLight("2")});
   const Outcome named = associatorNames(capabilitiesPath(), kAssocClass);
   clearLog();
   const Outcome unnamed = associatorNames(capabilitiesPath(), std::nullopt);
   EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(unnamed.paths(), named.paths());
+  EXPECT_EQ(blackbox::handOverKinds(unnamed),
+            (std::vector<std::string>{"ObjectPath Valid", "ObjectPath Valid"}));
   EXPECT_EQ(unnamed.paths(),
             (std::vector<ObjectPathValue>{lightRef("Blue Light:1"), lightRef("Blue Light:2")}));
+  EXPECT_EQ(unnamed.doneCount, 0u);
   EXPECT_EQ(traces(unnamed), traces(named));
+  EXPECT_EQ(traces(unnamed), std::vector<std::string>{kToLights});
   const std::string list = kStart + " _RefLeftClass=";
   expectLines({entering(kAssociatorNames, kFile, list), exiting(kAssociatorNames, kFile, list)});
 }
 
-TEST_F(ElementCapabilitiesAssociationTest,
-       NullAssocClassNamesFromAComputerSystemFailAsTheOwnClass) {
+TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassNamesFromAComputerSystemGiveNothing) {
   useTree({blueLight("1")});
+  const std::string text = "Object Path is NULL in AssociatorsNames.";
   const Outcome named = associatorNames(computerSystemPath(kSystemName), kAssocClass);
+  EXPECT_EQ(named.status, StatusValue(CMPI_RC_ERR_FAILED, text));
+  EXPECT_TRUE(named.results.empty());
+  EXPECT_EQ(named.doneCount, 0u);
+  EXPECT_EQ(traces(named), std::vector<std::string>{warning(text)});
+  expectLines(
+      {entering(kAssociatorNames, kFile,
+                associatorNamesList(kAssocClass, std::nullopt, std::nullopt, std::nullopt))});
+
   clearLog();
   const Outcome unnamed = associatorNames(computerSystemPath(kSystemName), std::nullopt);
-  const std::string text = "Object Path is NULL in AssociatorsNames.";
-  EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_ERR_FAILED, text));
-  EXPECT_EQ(unnamed.status, named.status);
+  EXPECT_EQ(unnamed.status, StatusValue(CMPI_RC_OK));
   EXPECT_TRUE(unnamed.results.empty());
-  EXPECT_EQ(traces(unnamed), traces(named));
-  expectLines({entering(kAssociatorNames, kFile, kStart + " _RefLeftClass=")});
+  EXPECT_EQ(unnamed.doneCount, 0u);
+  EXPECT_TRUE(traces(unnamed).empty());
+  expectLines({entering(kAssociatorNames, kFile, kNullClassList),
+               exiting(kAssociatorNames, kFile, kNullClassList)});
+  EXPECT_EQ(targetResolutionLines(),
+            (std::vector<std::string>{
+                entering("get_assoc_targetClass_ObjectPath", kFactoryFile, kAskedWithOwnClass),
+                entering("get_assoc_targetClass_Name", kFactoryFile, kAskedWithOwnClass),
+                exiting("get_assoc_targetClass_ObjectPath", kFactoryFile, kAskedWithOwnClass)}));
+}
+
+// Only the two ends, by their exact class names, start this association; every other source
+// gets nothing with a null class, the result class and roles making no difference.
+TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromAnyOtherClassGivesNothing) {
+  useTree({blueLight("1")});
+  const std::vector<ObjectPathValue> sources = {
+      classPath("KESTA_ComputerSystem"), ObjectPathValue(kNameSpace, "CIM_AlarmDevice"),
+      ObjectPathValue(kNameSpace, "kesta_bluelight"),
+      ObjectPathValue(kNameSpace, "KESTA_BlueLightElementCapabilities"),
+      computerSystemPath("elsewhere", "root/other")};
+  for (const ObjectPathValue& source : sources) {
+    SCOPED_TRACE(source.toString());
+    clearLog();
+    const Outcome outcome =
+        associators(source, std::nullopt, kCapabilitiesClass, std::string("ManagedElement"),
+                    std::string("Capabilities"), std::vector<std::string>{"InstanceID"});
+    EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
+    EXPECT_TRUE(outcome.results.empty());
+    EXPECT_EQ(outcome.doneCount, 0u);
+    EXPECT_TRUE(traces(outcome).empty());
+    expectLines({entering(kAssociators, kFile, kNullClassList),
+                 exiting(kAssociators, kFile, kNullClassList)});
+
+    clearLog();
+    const Outcome names = associatorNames(source, std::nullopt, kLightClass);
+    EXPECT_EQ(names.status, StatusValue(CMPI_RC_OK));
+    EXPECT_TRUE(names.results.empty());
+    EXPECT_EQ(names.doneCount, 0u);
+    EXPECT_TRUE(traces(names).empty());
+    expectLines({entering(kAssociatorNames, kFile, kNullClassList),
+                 exiting(kAssociatorNames, kFile, kNullClassList)});
+  }
+}
+
+// From an end, a far end the broker could not make is still the no-target failure with a null
+// class: only the source decides that there is nothing to answer.
+TEST_F(ElementCapabilitiesAssociationTest, NullAssocClassFromALightWithoutATargetPathStillFails) {
+  useTree({blueLight("1")});
+  for (bool namesOnly : {false, true}) {
+    SCOPED_TRACE(namesOnly ? "AssociatorNames" : "Associators");
+    const std::string text = namesOnly ? "Object Path is NULL in AssociatorsNames."
+                                       : "Object Path is NULL in Associators.";
+    const std::string& function = namesOnly ? kAssociatorNames : kAssociators;
+    broker_.clearFaults();
+    broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 1));
+    clearLog();
+    const Outcome outcome = namesOnly ? associatorNames(lightPath("Blue Light:1"), std::nullopt)
+                                      : associators(lightPath("Blue Light:1"), std::nullopt);
+    EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, text));
+    EXPECT_TRUE(outcome.results.empty());
+    EXPECT_EQ(outcome.doneCount, 0u);
+    EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToCapabilities, warning(text)}));
+    expectLines({entering(function, kFile, kNullClassList)});
+  }
+  broker_.clearFaults();
 }
 
 TEST_F(ElementCapabilitiesAssociationTest, NullArgumentsCutTheListWhereTheyStand) {

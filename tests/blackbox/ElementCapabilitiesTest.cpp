@@ -50,22 +50,22 @@ std::string warning(const std::string& text) { return "2 " + kComponent + ": " +
 
 // The texts of the builder's and the name enumeration's failures, with their runs of blanks
 // spelt out so that a lost or added blank is seen.
-const std::string kT1Trace =
+const std::string kBuilderNoLightPathsTrace =
     "***Can't get BlueLight ObjectPaths." + blanks(13) + "Exiting EnumerateInstanceNames***";
-const std::string kT2Status = "CMPIObjectPath is" + blanks(17) + "NULL for BlueLight";
-const std::string kT2Trace = "CMPIObjectPath is NULL for BlueLight";
-const std::string kT3Trace = "***Can't get ObjectPaths for" + blanks(17) + "Capabilities" +
+const std::string kBuilderLightPathNullStatus = "CMPIObjectPath is" + blanks(17) + "NULL for BlueLight";
+const std::string kBuilderLightPathNullTrace = "CMPIObjectPath is NULL for BlueLight";
+const std::string kBuilderNoCapabilitiesPathsTrace = "***Can't get ObjectPaths for" + blanks(17) + "Capabilities" +
                              blanks(17) + "Exiting EnumerateInstanceNames***";
-const std::string kT4Status = "CMPIObjectPath is" + blanks(21) + "NULL for Capabilities";
-const std::string kT4Trace = "CMPIObjectPath is NULL for Capabilities";
-const std::string kT5Status = "Create CMPIObjectPath failed for ElementCapabilities";
-const std::string kT5Trace = "Create CMPIObjectPath failed for ElementCapabilities.";
-const std::string kN1Text = "CMPIObjectPath is NULL for BlueLight class";
-const std::string kN2Status = "CMPIObjectPath is" + blanks(21) + "NULL for BlueLightCapabilities";
-const std::string kN2Trace = "CMPIObjectPath is NULL for" + blanks(21) + "Capabilities";
-const std::string kN3Status =
+const std::string kBuilderCapabilitiesCheckStatus = "CMPIObjectPath is" + blanks(21) + "NULL for Capabilities";
+const std::string kBuilderCapabilitiesCheckTrace = "CMPIObjectPath is NULL for Capabilities";
+const std::string kBuilderAssociationPathStatus = "Create CMPIObjectPath failed for ElementCapabilities";
+const std::string kBuilderAssociationPathTrace = "Create CMPIObjectPath failed for ElementCapabilities.";
+const std::string kNamesLightPathNullText = "CMPIObjectPath is NULL for BlueLight class";
+const std::string kNamesCapabilitiesPathNullStatus = "CMPIObjectPath is" + blanks(21) + "NULL for BlueLightCapabilities";
+const std::string kNamesCapabilitiesPathNullTrace = "CMPIObjectPath is NULL for" + blanks(21) + "Capabilities";
+const std::string kNamesAssociationPathStatus =
     "Create CMPIObjectPath failed" + blanks(21) + "for ElementCapabilities";
-const std::string kN3Trace =
+const std::string kNamesAssociationPathTrace =
     "Create CMPIObjectPath failed" + blanks(21) + "for ElementCapabilities.";
 
 // What the factory reports when it cannot make a path (its own texts, seen here only in
@@ -225,64 +225,64 @@ TEST_F(ElementCapabilitiesInstanceTest, EnumInstanceNamesLeavesTheEndPathsAsTheF
                                                "root/cimv2:" + kAssocClass}));
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, N1LightPathWithoutHandleFailsAtOnce) {
+TEST_F(ElementCapabilitiesInstanceTest, NamesFailAtOnceOnALightPathWithoutHandle) {
   useTree({blueLight("1")});
   // The fourth key completes the light's path; it loses its handle right after.
   const auto fault = broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 4));
   const Outcome outcome = enumerateNames();
   EXPECT_EQ(broker_.faultFireCount(fault), 1u);
-  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kN1Text));
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kNamesLightPathNullText));
   EXPECT_TRUE(outcome.results.empty());
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kN1Text)});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kNamesLightPathNullText)});
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, N1OnTheSecondLightKeepsTheFirstName) {
+TEST_F(ElementCapabilitiesInstanceTest, NamesKeepTheFirstPairWhenTheSecondLightPathLosesItsHandle) {
   useTree({blueLight("1"), blueLight("2")});
   broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 8));
   const Outcome outcome = enumerateNames();
-  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kN1Text));
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kNamesLightPathNullText));
   EXPECT_EQ(outcome.paths(), std::vector<ObjectPathValue>{pairName("Blue Light:1")});
   EXPECT_EQ(outcome.count(ResultKind::ObjectPath), 1u);
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kN1Text)});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kNamesLightPathNullText)});
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, N2CapabilitiesPathWithoutHandle) {
+TEST_F(ElementCapabilitiesInstanceTest, NamesFailOnACapabilitiesPathWithoutHandle) {
   useTree({blueLight("1")});
   // Four keys for the light, then the capabilities path's one key.
   broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 5));
   const Outcome outcome = enumerateNames();
-  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kN2Status));
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kNamesCapabilitiesPathNullStatus));
   EXPECT_TRUE(outcome.results.empty());
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kN2Trace)});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kNamesCapabilitiesPathNullTrace)});
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, N3AssociationPathNotMade) {
+TEST_F(ElementCapabilitiesInstanceTest, NamesFailWhenTheAssociationPathCannotBeMade) {
   useTree({blueLight("1")});
   // Paths made: the light, the capabilities, then the association.
   broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 3));
   const Outcome outcome = enumerateNames();
-  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kN3Status));
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kNamesAssociationPathStatus));
   EXPECT_TRUE(outcome.results.empty());
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kN3Trace)});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kNamesAssociationPathTrace)});
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, N3AssociationPathWithoutHandleOnTheSecondLight) {
+TEST_F(ElementCapabilitiesInstanceTest, NamesKeepTheFirstPairWhenTheSecondAssociationPathHasNoHandle) {
   useTree({blueLight("1"), blueLight("2")});
   // Two lights, then per light its capabilities path and its association path.
   broker_.armFault(Fault::nullHandle(CreatingFunction::NewObjectPath, 6));
   const Outcome outcome = enumerateNames();
-  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kN3Status));
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_ERR_FAILED, kNamesAssociationPathStatus));
   EXPECT_EQ(outcome.paths(), std::vector<ObjectPathValue>{pairName("Blue Light:1")});
   EXPECT_EQ(outcome.doneCount, 0u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kN3Trace)});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kNamesAssociationPathTrace)});
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
@@ -315,13 +315,13 @@ TEST_F(ElementCapabilitiesInstanceTest, CapabilitiesFailureOnTheSecondLightKeeps
 // ---------------------------------------------------------------------------------------------
 
 TEST_F(ElementCapabilitiesInstanceTest, EnumInstancesWithoutLightsStillEndsNormally) {
-  // The builder fails with T1; unlike EnumInstanceNames, the enumeration ends with its exit
+  // The builder fails for want of light paths; unlike EnumInstanceNames, the enumeration ends with its exit
   // line and CMReturnDone.
   const Outcome outcome = enumerate();
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   ASSERT_EQ(outcome.results.size(), 1u);
   EXPECT_EQ(outcome.results[0].kind, ResultKind::Done);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kT1Trace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
   EXPECT_TRUE(newStrings(outcome).empty());
   expectBuilderFailureLines(kEnum, kEnumList);
 }
@@ -429,20 +429,20 @@ TEST_F(ElementCapabilitiesInstanceTest, EnumInstancesHandsOverAnInstanceWithoutH
 // never reaches the operation: its texts are seen only in what it asked CMNewString to make.
 // ---------------------------------------------------------------------------------------------
 
-TEST_F(ElementCapabilitiesInstanceTest, T1LightPathsNotMade) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheLightPathsCannotBeMade) {
   useTree({blueLight("1")});
   broker_.armFault(Fault::errorStatus(CreatingFunction::NewObjectPath, 1));
   const Outcome outcome = enumerate();
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kLightPathFailedTrace, warning(kT1Trace)}));
-  // Only the factory's own message; T1 has none.
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kLightPathFailedTrace, warning(kBuilderNoLightPathsTrace)}));
+  // Only the factory's own message; the builder's failure for want of light paths has none.
   EXPECT_EQ(newStrings(outcome), std::vector<std::string>{"Create CMPIObjectPath failed."});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T2LightPathWithoutHandle) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneOnALightPathWithoutHandle) {
   useTree({blueLight("1")});
   const auto fault = broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 4));
   const Outcome outcome = enumerate();
@@ -450,12 +450,12 @@ TEST_F(ElementCapabilitiesInstanceTest, T2LightPathWithoutHandle) {
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kT2Trace)});
-  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kT2Status});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kBuilderLightPathNullTrace)});
+  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kBuilderLightPathNullStatus});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T2OnTheSecondLightHandsOverNothing) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheSecondLightPathLosesItsHandle) {
   // The first pair was made, but a failing builder hands nothing to EnumInstances.
   useTree({blueLight("1"), blueLight("2")});
   broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 8));
@@ -464,24 +464,24 @@ TEST_F(ElementCapabilitiesInstanceTest, T2OnTheSecondLightHandsOverNothing) {
   EXPECT_EQ(callCount(outcome, "CMPIBrokerEncFT", "newInstance"), 1u);
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kT2Trace)});
-  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kT2Status});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kBuilderLightPathNullTrace)});
+  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kBuilderLightPathNullStatus});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T3CapabilitiesPathsNotMade) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheCapabilitiesPathsCannotBeMade) {
   useTree({blueLight("1")});
   broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 2));
   const Outcome outcome = enumerate();
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kT3Trace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kBuilderNoCapabilitiesPathsTrace)}));
   EXPECT_EQ(newStrings(outcome), std::vector<std::string>{"Create CMPIObjectPath failed"});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T3OnTheSecondLightHandsOverNothing) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheSecondLightsCapabilitiesPathCannotBeMade) {
   useTree({blueLight("1"), blueLight("2")});
   // Lights 1 and 2, capabilities and association of light 1, then capabilities of light 2.
   broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 5));
@@ -490,11 +490,11 @@ TEST_F(ElementCapabilitiesInstanceTest, T3OnTheSecondLightHandsOverNothing) {
   EXPECT_EQ(callCount(outcome, "CMPIBrokerEncFT", "newInstance"), 1u);
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kT3Trace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kBuilderNoCapabilitiesPathsTrace)}));
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T4LightPathLosesItsHandleAfterItsNamespaceIsSet) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenALightPathLosesItsHandleAfterItsNamespaceIsSet) {
   useTree({blueLight("1")});
   // The factory sets the light's namespace (1), then the builder sets it again (2): the path
   // passes the first check and fails the one before the capabilities.
@@ -505,8 +505,8 @@ TEST_F(ElementCapabilitiesInstanceTest, T4LightPathLosesItsHandleAfterItsNamespa
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kT4Trace)});
-  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kT4Status});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kBuilderCapabilitiesCheckTrace)});
+  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kBuilderCapabilitiesCheckStatus});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
@@ -524,7 +524,7 @@ TEST_F(ElementCapabilitiesInstanceTest, CapabilitiesPathWithoutHandleIsNotChecke
                exiting(kBuilder, kFile, kBuilderList), exiting(kEnum, kFile, kEnumList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, T5AssociationPathNotMadeOrWithoutHandle) {
+TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheAssociationPathIsNotMadeOrHasNoHandle) {
   for (const Fault& fault : {Fault::nullResult(CreatingFunction::NewObjectPath, 3),
                              Fault::nullHandle(CreatingFunction::NewObjectPath, 3)}) {
     SCOPED_TRACE(::testing::PrintToString(fault.kind));
@@ -536,8 +536,8 @@ TEST_F(ElementCapabilitiesInstanceTest, T5AssociationPathNotMadeOrWithoutHandle)
     EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
     EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
     EXPECT_EQ(outcome.doneCount, 1u);
-    EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kT5Trace)});
-    EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kT5Status});
+    EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kBuilderAssociationPathTrace)});
+    EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kBuilderAssociationPathStatus});
     expectBuilderFailureLines(kEnum, kEnumList);
   }
 }
@@ -549,8 +549,8 @@ TEST_F(ElementCapabilitiesInstanceTest, BuilderFailureThroughGetInstanceStillEnd
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kT5Trace)});
-  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kT5Status});
+  EXPECT_EQ(traces(outcome), std::vector<std::string>{warning(kBuilderAssociationPathTrace)});
+  EXPECT_EQ(newStrings(outcome), std::vector<std::string>{kBuilderAssociationPathStatus});
   expectBuilderFailureLines(kGet, kGetList);
 }
 
@@ -559,7 +559,7 @@ TEST_F(ElementCapabilitiesInstanceTest, GetInstanceWithoutLightsFindsNothing) {
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   ASSERT_EQ(outcome.results.size(), 1u);
   EXPECT_EQ(outcome.results[0].kind, ResultKind::Done);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kT1Trace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
   expectBuilderFailureLines(kGet, kGetList);
 }
 

@@ -195,6 +195,21 @@ class SystemDeviceAssociationTest : public blackbox::BlackboxTest {
     return path;
   }
 
+  // A computer system as the host's up-calls answer it.
+  static InstanceValue computerSystem(const std::string& name) {
+    InstanceValue system(computerSystemPath(name));
+    system.set("CreationClassName", Value("KESTA_ComputerSystem"));
+    system.set("Name", Value(name));
+    return system;
+  }
+
+  // The path of a light as the provider makes it.
+  static ObjectPathValue lightRef(const std::string& deviceID) {
+    ObjectPathValue path = lightPath(deviceID);
+    path.setHost("bbhost.example");
+    return path;
+  }
+
   CMPIAssociationMI* mi_;
 };
 
@@ -534,9 +549,29 @@ TEST_F(SystemDeviceAssociationTest, AssociatorNamesFromTheCapabilitiesEndSilentl
 
 // ---- A null association class -------------------------------------------------------------
 
+// The entry and exit lines with a null association class: the list stops after its key.
+const std::string kNullClassList = " mi=PTR ctx=PTR result=PTR ref=PTR _RefLeftClass=";
+// The target chooser is asked with this association's own class and no result class.
+const std::string kAskedWithOwnClass =
+    " broker=PTR ref=PTR _RefLeftClass=KESTA_BlueLightSystemDevice _RefRightClass=";
+
+// Every entry and exit line of the factory's target resolution, in order.
+std::vector<std::string> targetResolutionLines(const std::vector<std::string>& factoryLog) {
+  std::vector<std::string> lines;
+  for (const std::string& line : factoryLog) {
+    if (line.rfind("ENTERING: get_assoc_targetClass_", 0) == 0 ||
+        line.rfind("EXITING: get_assoc_targetClass_", 0) == 0) {
+      lines.push_back(line);
+    }
+  }
+  return lines;
+}
+
 // Object managers pass no association class when the client named none; the provider answers as
-// for its own association, and traces the argument as it came.
-TEST_F(SystemDeviceAssociationTest, NullAssociationClassAnswersAsTheOwnAssociation) {
+// for its own association, and traces the argument as it came. From the capabilities record, not
+// an end, the answer is the same nothing as with the class named, but the unnamed request is
+// logged as any operation that found nothing, with its exit line.
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassGivesTheOwnAnswersAndAlwaysLogsTheExit) {
   struct Case {
     std::string name;
     ObjectPathValue from;
@@ -546,30 +581,41 @@ TEST_F(SystemDeviceAssociationTest, NullAssociationClassAnswersAsTheOwnAssociati
     SCOPED_TRACE(c.name);
     clearLog();
     const Outcome named = associators(c.from, kAssocClass);
+    const std::string namedList =
+        associatorsList(kAssocClass, std::nullopt, std::nullopt, std::nullopt, std::nullopt);
+    std::vector<std::string> namedExpected = {
+        entering("BlueLightSystemDevice_Associators", kFile, namedList)};
+    if (c.name != "capabilities") {
+      namedExpected.push_back(exiting("BlueLightSystemDevice_Associators", kFile, namedList));
+    }
+    EXPECT_EQ(providerLog(), namedExpected);
     clearLog();
     const Outcome unnamed = associators(c.from, std::nullopt);
     EXPECT_EQ(unnamed.status, named.status);
     EXPECT_EQ(handedOver(unnamed), handedOver(named));
     EXPECT_EQ(traces(unnamed), traces(named));
     const std::string list = " mi=PTR ctx=PTR result=PTR ref=PTR _RefLeftClass=";
-    std::vector<std::string> expected = {
-        entering("BlueLightSystemDevice_Associators", kFile, list)};
-    if (c.name != "capabilities") {
-      expected.push_back(exiting("BlueLightSystemDevice_Associators", kFile, list));
-    }
+    std::vector<std::string> expected = {entering("BlueLightSystemDevice_Associators", kFile, list),
+                                         exiting("BlueLightSystemDevice_Associators", kFile, list)};
     EXPECT_EQ(providerLog(), expected);
 
     clearLog();
     const Outcome namedNames = associatorNames(c.from, kAssocClass);
+    const std::string namedNamesList =
+        associatorNamesList(kAssocClass, std::nullopt, std::nullopt, std::nullopt);
+    namedExpected = {entering("BlueLightSystemDevice_AssociatorNames", kFile, namedNamesList)};
+    if (c.name != "capabilities") {
+      namedExpected.push_back(
+          exiting("BlueLightSystemDevice_AssociatorNames", kFile, namedNamesList));
+    }
+    EXPECT_EQ(providerLog(), namedExpected);
     clearLog();
     const Outcome unnamedNames = associatorNames(c.from, std::nullopt);
     EXPECT_EQ(unnamedNames.status, namedNames.status);
     EXPECT_EQ(handedOver(unnamedNames), handedOver(namedNames));
     EXPECT_EQ(traces(unnamedNames), traces(namedNames));
-    expected = {entering("BlueLightSystemDevice_AssociatorNames", kFile, list)};
-    if (c.name != "capabilities") {
-      expected.push_back(exiting("BlueLightSystemDevice_AssociatorNames", kFile, list));
-    }
+    expected = {entering("BlueLightSystemDevice_AssociatorNames", kFile, list),
+                exiting("BlueLightSystemDevice_AssociatorNames", kFile, list)};
     EXPECT_EQ(providerLog(), expected);
   }
 }
@@ -578,7 +624,17 @@ TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromALightGivesTheComput
   const Outcome outcome = associators(light(), std::nullopt);
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(namesOf(outcome.instances()), (std::vector<std::string>{"cs1", "cs2"}));
+  EXPECT_EQ(outcome.instances(),
+            (std::vector<InstanceValue>{computerSystem("cs1"), computerSystem("cs2")}));
+  EXPECT_EQ(blackbox::handOverKinds(outcome),
+            (std::vector<std::string>{"Instance Valid", "Instance Valid"}));
+  EXPECT_EQ(outcome.doneCount, 0u);
   EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToSystemsTrace}));
+  EXPECT_EQ(providerLog(),
+            (std::vector<std::string>{
+                entering("BlueLightSystemDevice_Associators", kFile, kNullClassList),
+                exiting("BlueLightSystemDevice_Associators", kFile, kNullClassList)}));
+  expectTraceCopy();
   // The target chooser is asked for this association by name.
   const std::vector<std::string> factory = log(kFactoryCategory);
   ASSERT_FALSE(factory.empty());
@@ -587,26 +643,152 @@ TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromALightGivesTheComput
       << factory.front();
 }
 
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromAComputerSystemGivesTheLightInstances) {
+  const Outcome named = associators(computerSystemPath("cs1"), kAssocClass);
+  clearLog();
+  const Outcome outcome = associators(computerSystemPath("cs1"), std::nullopt);
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
+  EXPECT_EQ(outcome.instances(), named.instances());
+  std::vector<ObjectPathValue> paths;
+  for (const InstanceValue& instance : outcome.instances()) {
+    paths.push_back(instance.path());
+    EXPECT_EQ(instance.className(), "KESTA_BlueLight");
+    EXPECT_EQ(instance.propertyCount(), 15u) << instance;
+  }
+  EXPECT_EQ(paths, (std::vector<ObjectPathValue>{lightRef(kLight1), lightRef(kLight2)}));
+  EXPECT_EQ(blackbox::handOverKinds(outcome),
+            (std::vector<std::string>{"Instance Valid", "Instance Valid"}));
+  EXPECT_EQ(outcome.doneCount, 0u);
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToLightsTrace}));
+  EXPECT_EQ(providerLog(),
+            (std::vector<std::string>{
+                entering("BlueLightSystemDevice_Associators", kFile, kNullClassList),
+                exiting("BlueLightSystemDevice_Associators", kFile, kNullClassList)}));
+  expectTraceCopy();
+}
+
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassNamesFromALightGiveTheComputerSystemPaths) {
+  const Outcome outcome = associatorNames(light(), std::nullopt);
+  EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
+  EXPECT_EQ(outcome.paths(),
+            (std::vector<ObjectPathValue>{computerSystemPath("cs1"), computerSystemPath("cs2")}));
+  EXPECT_EQ(blackbox::handOverKinds(outcome),
+            (std::vector<std::string>{"ObjectPath Valid", "ObjectPath Valid"}));
+  EXPECT_EQ(outcome.doneCount, 0u);
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToSystemsTrace}));
+  EXPECT_EQ(providerLog(),
+            (std::vector<std::string>{
+                entering("BlueLightSystemDevice_AssociatorNames", kFile, kNullClassList),
+                exiting("BlueLightSystemDevice_AssociatorNames", kFile, kNullClassList)}));
+  expectTraceCopy();
+}
+
 TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromAComputerSystemGivesTheLights) {
   const Outcome outcome = associatorNames(computerSystemPath("cs1"), std::nullopt);
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(namesOf(outcome.paths()), (std::vector<std::string>{kLight1, kLight2}));
+  EXPECT_EQ(outcome.paths(), (std::vector<ObjectPathValue>{lightRef(kLight1), lightRef(kLight2)}));
+  EXPECT_EQ(blackbox::handOverKinds(outcome),
+            (std::vector<std::string>{"ObjectPath Valid", "ObjectPath Valid"}));
+  EXPECT_EQ(outcome.doneCount, 0u);
   EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToLightsTrace}));
+  EXPECT_EQ(providerLog(),
+            (std::vector<std::string>{
+                entering("BlueLightSystemDevice_AssociatorNames", kFile, kNullClassList),
+                exiting("BlueLightSystemDevice_AssociatorNames", kFile, kNullClassList)}));
+  expectTraceCopy();
 }
 
 // The capabilities record is not an end of this association: nothing, silently, with success,
-// exactly as with the association class named.
-TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromTheCapabilitiesGivesNothing) {
+// as with the association class named. Unnamed, it is a request that every association provider
+// gets, and it is logged as any operation that found nothing: the entry and the exit line.
+// Named, it stays as it was: the entry line only.
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromTheCapabilitiesGivesNothingAndExits) {
   for (bool names : {false, true}) {
     SCOPED_TRACE(names ? "AssociatorNames" : "Associators");
+    const std::string function =
+        names ? "BlueLightSystemDevice_AssociatorNames" : "BlueLightSystemDevice_Associators";
+    clearLog();
+    const Outcome named = names ? associatorNames(capabilitiesPath(), kAssocClass)
+                                : associators(capabilitiesPath(), kAssocClass);
+    EXPECT_EQ(named.status, StatusValue(CMPI_RC_OK));
+    EXPECT_TRUE(named.results.empty());
+    EXPECT_EQ(named.doneCount, 0u);
+    EXPECT_TRUE(named.traces.empty());
+    const std::string namedList =
+        names
+            ? associatorNamesList(kAssocClass, std::nullopt, std::nullopt, std::nullopt)
+            : associatorsList(kAssocClass, std::nullopt, std::nullopt, std::nullopt, std::nullopt);
+    EXPECT_EQ(providerLog(), (std::vector<std::string>{entering(function, kFile, namedList)}));
+
     clearLog();
     const Outcome outcome = names ? associatorNames(capabilitiesPath(), std::nullopt)
                                   : associators(capabilitiesPath(), std::nullopt);
     EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
     EXPECT_TRUE(outcome.results.empty());
+    EXPECT_EQ(outcome.doneCount, 0u);
     EXPECT_TRUE(outcome.traces.empty());
-    EXPECT_EQ(providerLog().size(), 1u);
+    EXPECT_EQ(providerLog(), (std::vector<std::string>{entering(function, kFile, kNullClassList),
+                                                       exiting(function, kFile, kNullClassList)}));
+    expectTraceCopy();
+    // The target chooser is still asked with the association's own class and finds no far end.
+    EXPECT_EQ(targetResolutionLines(log(kFactoryCategory)),
+              (std::vector<std::string>{entering("get_assoc_targetClass_ObjectPath",
+                                                 "BlueLightObjFactory.cpp", kAskedWithOwnClass),
+                                        entering("get_assoc_targetClass_Name",
+                                                 "BlueLightObjFactory.cpp", kAskedWithOwnClass),
+                                        exiting("get_assoc_targetClass_ObjectPath",
+                                                "BlueLightObjFactory.cpp", kAskedWithOwnClass)}));
   }
+}
+
+// Only the two ends, by their exact class names, start this association; every other source
+// gets nothing with a null class, and the exit line.
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassFromAnyOtherClassGivesNothingAndExits) {
+  for (const ObjectPathValue& source :
+       {classPath("CIM_ComputerSystem"), ObjectPathValue("root/cimv2", "kesta_computersystem"),
+        ObjectPathValue("root/cimv2", "CIM_AlarmDevice"), classPath(kAssocClass),
+        capabilitiesPath("root/other")}) {
+    SCOPED_TRACE(source.toString());
+    for (bool names : {false, true}) {
+      SCOPED_TRACE(names ? "AssociatorNames" : "Associators");
+      const std::string function =
+          names ? "BlueLightSystemDevice_AssociatorNames" : "BlueLightSystemDevice_Associators";
+      clearLog();
+      const Outcome outcome =
+          names ? associatorNames(source, std::nullopt)
+                : associators(source, std::nullopt, std::string("X"), std::string("Group"),
+                              std::string("Part"), std::vector<std::string>{"Name"});
+      EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
+      EXPECT_TRUE(outcome.results.empty());
+      EXPECT_EQ(outcome.doneCount, 0u);
+      EXPECT_TRUE(outcome.traces.empty());
+      EXPECT_EQ(providerLog(),
+                (std::vector<std::string>{entering(function, kFile, kNullClassList),
+                                          exiting(function, kFile, kNullClassList)}));
+    }
+  }
+}
+
+// From an end, a far end the broker could not make still ends silently without the exit line:
+// only the source decides that there is nothing to answer.
+TEST_F(SystemDeviceAssociationTest, NullAssociationClassWithoutATargetPathFromALightStaysSilent) {
+  for (bool names : {false, true}) {
+    SCOPED_TRACE(names ? "AssociatorNames" : "Associators");
+    const std::string function =
+        names ? "BlueLightSystemDevice_AssociatorNames" : "BlueLightSystemDevice_Associators";
+    broker_.clearFaults();
+    broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 1));
+    clearLog();
+    const Outcome outcome =
+        names ? associatorNames(light(), std::nullopt) : associators(light(), std::nullopt);
+    EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
+    EXPECT_TRUE(outcome.results.empty());
+    EXPECT_EQ(outcome.doneCount, 0u);
+    EXPECT_EQ(traces(outcome), (std::vector<std::string>{kToSystemsTrace}));
+    EXPECT_EQ(providerLog(), (std::vector<std::string>{entering(function, kFile, kNullClassList)}));
+  }
+  broker_.clearFaults();
 }
 
 TEST_F(SystemDeviceAssociationTest, NullAssociationClassKeepsTheResultClassTest) {

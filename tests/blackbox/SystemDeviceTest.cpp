@@ -358,7 +358,7 @@ TEST_F(SystemDeviceTest, NamesTreatAMissingEnumerationWithoutErrorAsNoComputerSy
   EXPECT_EQ(providerLog(), (std::vector<std::string>{namesIn(), namesOut()}));
 }
 
-// Row E1, the computer-system class path.
+// The names fail: the computer-system class path.
 TEST_F(SystemDeviceTest, NamesFailWhenTheComputerSystemPathCannotBeMade) {
   const std::uint64_t nth = nthCall(names(), "newObjectPath",
                                     "CMPIBrokerEncFT.newObjectPath(root/cimv2, "
@@ -383,7 +383,7 @@ TEST_F(SystemDeviceTest, NamesFailWhenTheComputerSystemPathCannotBeMade) {
   }
 }
 
-// Row E2: a light path that was fine when the factory made it and lost its handle afterwards.
+// The names fail: a light path that was fine when the factory made it and lost its handle afterwards.
 TEST_F(SystemDeviceTest, NamesFailOnALightPathWithoutHandle) {
   // Each light path gets four keys; the fourth addKey is the last call on the first light path.
   broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 4));
@@ -408,7 +408,7 @@ TEST_F(SystemDeviceTest, NamesKeepWhatWasReturnedBeforeALightPathWithoutHandle) 
   EXPECT_EQ(providerLog(), (std::vector<std::string>{namesIn()}));
 }
 
-// Row E3, the association path.
+// The names fail: the association path.
 TEST_F(SystemDeviceTest, NamesFailWhenAnAssociationPathCannotBeMade) {
   const std::string call = "CMPIBrokerEncFT.newObjectPath(root/cimv2, " + kAssocClass + ")";
   const Outcome clean = names();
@@ -550,7 +550,7 @@ TEST_F(SystemDeviceTest, InstancesSurviveAFailingUpcallWithSuccess) {
   expectTraceCopy();
 }
 
-// Row S1.
+// The instances: the computer-system class path cannot be made.
 TEST_F(SystemDeviceTest, InstancesReportAComputerSystemPathThatCannotBeMade) {
   for (const Fault& fault : {Fault::nullResult(CreatingFunction::NewObjectPath, 1),
                              Fault::nullHandle(CreatingFunction::NewObjectPath, 1)}) {
@@ -575,7 +575,7 @@ TEST_F(SystemDeviceTest, InstancesReportAComputerSystemPathThatCannotBeMade) {
   }
 }
 
-// Row S2.
+// The instances: a light path without handle stops the builder.
 TEST_F(SystemDeviceTest, InstancesStopAtALightPathWithoutHandle) {
   for (std::uint64_t nth : {4u, 8u}) {
     SCOPED_TRACE("addKey " + std::to_string(nth));
@@ -596,7 +596,7 @@ TEST_F(SystemDeviceTest, InstancesStopAtALightPathWithoutHandle) {
   }
 }
 
-// Row S3: reported, that light skipped, the rest goes on.
+// The instances: an association path that cannot be made is reported, that light skipped, the rest goes on.
 TEST_F(SystemDeviceTest, InstancesSkipALightWhoseAssociationPathCannotBeMade) {
   const std::string call = "CMPIBrokerEncFT.newObjectPath(root/cimv2, " + kAssocClass + ")";
   const Outcome clean = instances();

@@ -291,14 +291,20 @@ TEST_F(CliEndToEnd, AssociatorsOfTheComputerSystemAreItsLights) {
   EXPECT_EQ(result.err, kOk);
 }
 
-TEST_F(CliEndToEnd, AssociatorsOfTheComputerSystemWithoutAssociationClassFail) {
-  // The capabilities association has no far end for a computer system and says so.
+TEST_F(CliEndToEnd, AssociatorsOfTheComputerSystemWithoutAssociationClassGiveItsLights) {
+  // Both association providers are asked; the capabilities association does not start at a
+  // computer system and adds nothing, without failing the request.
   const ProcessResult result = run({"ai", kSystemKeys});
-  EXPECT_EQ(result.exitCode, 1);
-  EXPECT_EQ(result.out, "");
-  EXPECT_TRUE(
-      result.err.rfind("status: CMPI_RC_ERR_FAILED: Object Path is NULL in Associators.\n", 0) == 0)
-      << result.err;
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  EXPECT_EQ(result.out, kLightMof1 + "\n" + kLightMof2);
+  EXPECT_EQ(result.err, "status: CMPI_RC_OK\n");
+}
+
+TEST_F(CliEndToEnd, AssociatorNamesOfTheComputerSystemWithoutAssociationClassGiveItsLights) {
+  const ProcessResult result = run({"ain", kSystemKeys});
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  EXPECT_EQ(result.out, kLightPath1 + "\n" + kLightPath2 + "\n");
+  EXPECT_EQ(result.err, "status: CMPI_RC_OK\n");
 }
 
 TEST_F(CliEndToEnd, AssociationClassThatNoProviderServes) {
