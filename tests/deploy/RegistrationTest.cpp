@@ -385,7 +385,7 @@ TEST(ProviderTableTest, TheToolsProviderMapIsTheTables) {
 
   std::vector<std::string> toolAssociations;
   for (const bluelight::cli::ProviderInfo* provider : bluelight::cli::associationProviders()) {
-    toolAssociations.push_back(provider->name);
+    toolAssociations.emplace_back(provider->name);
     EXPECT_EQ(bluelight::cli::associationProviderFor(provider->className), provider);
   }
   EXPECT_EQ(toolAssociations, associationTable);
