@@ -8,6 +8,10 @@
 //   walk   the platform opening an instrumentation cursor on the same JSON tree and walking its
 //          nodes (what reading the hardware costs).
 //
+// Beside them the snapshot parsers are measured on their own: the platform's parseNodeSnapshot
+// and a reader built on simdjson (SimdjsonSnapshotReader.h), on the text of Walk/4096's tree
+// (4,608 nodes) and of a tree of 65,537 nodes.
+//
 // The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
 // itself twice: once with the sink "none" and once with every line written to a file. Each run
 // measures the floor and the walk again, so every ratio compares figures taken side by side. The
@@ -45,6 +49,10 @@
 #include "AllocCounter.h"
 #include "KestaInstrumentation.h"
 #include "cmpihost/cmpihost.h"
+#include "instrumentation/json/SnapshotParser.h"
+#if BLUELIGHT_BENCH_SIMDJSON
+#include "SimdjsonSnapshotReader.h"
+#endif
 
 namespace {
 
@@ -387,6 +395,96 @@ Operation walk() {
 }
 
 // ---------------------------------------------------------------------------------------------
+// The snapshot parsers
+// ---------------------------------------------------------------------------------------------
+
+// The text of Walk/`lights`'s tree, as the provider reads it.
+std::string treeText(int lights) {
+  std::ifstream in(treeFile(lights));
+  std::ostringstream text;
+  text << in.rdbuf();
+  return text.str();
+}
+
+// A tree of `count` nodes, three in four of them blue lights, every one with a status and the
+// alarm state (the shape of the large trees in the platform's tests).
+std::string largeTreeText(int count) {
+  std::string text = "{\"nodes\": [\n";
+  for (int i = 0; i < count; ++i) {
+    text += (i == 0 ? "" : ",\n");
+    text += "{\"type\": " + std::string(i % 4 != 3 ? "26" : "7") + ", \"path\": \"1." +
+            std::to_string(i) + "\", \"description\": \"Blue Light\", \"status\": " +
+            std::to_string(i % 2 == 0 ? 1 : 20) +
+            ", \"properties\": {\"1\": " + std::to_string(1 + i % 3) + "}}";
+  }
+  return text + "\n]}\n";
+}
+
+using Nodes = std::vector<Kesta::platform::InstrumentationNode>;
+using Parse = std::function<Nodes(const std::string&)>;
+
+// Parses `text` again and again; N is the number of nodes. The nodes are checked against
+// parseNodeSnapshot's once, before the timing. `start` runs before that first call.
+void registerParse(
+    const std::string& name, const std::string& text, Parse parse,
+    const std::function<void()>& start = [] {}) {
+  const Nodes expected = Kesta::platform::parseNodeSnapshot(text);
+  const int count = static_cast<int>(expected.size());
+  benchmark::RegisterBenchmark(
+      (name + "/" + std::to_string(count)).c_str(),
+      [text, parse, expected, count, name, start](benchmark::State& state) {
+        start();
+        const std::int64_t before = bench::bytesInUse();
+        if (parse(text) != expected) {
+          state.SkipWithError((name + " read other nodes than parseNodeSnapshot").c_str());
+          return;
+        }
+        // What the first call left allocated: buffers kept for the next calls.
+        const std::int64_t kept = bench::bytesInUse() - before;
+        bench::HeapCost heap;
+        for (int i = 0; i < 3; ++i) {
+          const bench::HeapCost one = bench::measureHeap([&] { return parse(text).size(); });
+          heap.allocations = one.allocations;
+          heap.peakAbove = std::max(heap.peakAbove, one.peakAbove);
+        }
+        for (auto _ : state) {
+          benchmark::DoNotOptimize(parse(text));
+        }
+        state.counters["lights"] = count;
+        state.counters["allocs"] = static_cast<double>(heap.allocations);
+        state.counters["peak_B"] = static_cast<double>(heap.peakAbove);
+        state.counters["kept_B"] = static_cast<double>(kept);
+        state.counters["MB_per_s"] = benchmark::Counter(
+            static_cast<double>(text.size()) * static_cast<double>(state.iterations()) / 1e6,
+            benchmark::Counter::kIsRate);
+      })
+      ->UseRealTime()
+      ->Unit(benchmark::kMicrosecond);
+}
+
+void registerParsers(const std::string& prefix) {
+  for (const std::string& text : {treeText(4096), largeTreeText(65537)}) {
+    registerParse(prefix + "Parse.Hand", text,
+                  [](const std::string& json) { return Kesta::platform::parseNodeSnapshot(json); });
+#if BLUELIGHT_BENCH_SIMDJSON
+    for (const auto& [suffix, use] : {std::make_pair("", bench::ParserUse::kKept),
+                                      std::make_pair("Fresh", bench::ParserUse::kFresh)}) {
+      registerParse(
+          prefix + "Parse.Simdjson" + suffix, text,
+          [use = use](const std::string& json) {
+            Nodes nodes;
+            if (!bench::readSnapshotWithSimdjson(json, nodes, use)) {
+              throw std::runtime_error("the simdjson reader refused the tree");
+            }
+            return nodes;
+          },
+          bench::releaseKeptParser);
+    }
+#endif
+  }
+}
+
+// ---------------------------------------------------------------------------------------------
 // Running and recording
 // ---------------------------------------------------------------------------------------------
 
@@ -507,6 +605,7 @@ int runChild() {
     registerOperation(prefix + "Walk", count, walk(), n);
   }
   if (options.sink == "none") {
+    registerParsers(prefix);
     const auto n = static_cast<std::size_t>(kAssociationLights);
     const std::string association = "KESTA_BlueLightElementCapabilities";
     const std::string systemDevice = "KESTA_BlueLightSystemDevice";
