@@ -8,9 +8,8 @@
 //   walk   the platform opening an instrumentation cursor on the same JSON tree and walking its
 //          nodes (what reading the hardware costs).
 //
-// Beside them the snapshot parsers are measured on their own: the platform's parseNodeSnapshot
-// and a reader built on simdjson (SimdjsonSnapshotReader.h), on the text of Walk/4096's tree
-// (4,608 nodes) and of a tree of 65,537 nodes.
+// Beside them the snapshot parser (parseNodeSnapshot) is measured on its own, on the text of
+// Walk/4096's tree (4,608 nodes) and of a tree of 65,537 nodes.
 //
 // The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
 // itself twice: once with the sink "none" and once with every line written to a file. Each run
@@ -50,9 +49,6 @@
 #include "KestaInstrumentation.h"
 #include "cmpihost/cmpihost.h"
 #include "instrumentation/json/SnapshotParser.h"
-#if BLUELIGHT_BENCH_SIMDJSON
-#include "SimdjsonSnapshotReader.h"
-#endif
 
 namespace {
 
@@ -395,7 +391,7 @@ Operation walk() {
 }
 
 // ---------------------------------------------------------------------------------------------
-// The snapshot parsers
+// The snapshot parser
 // ---------------------------------------------------------------------------------------------
 
 // The text of Walk/`lights`'s tree, as the provider reads it.
@@ -420,27 +416,15 @@ std::string largeTreeText(int count) {
   return text + "\n]}\n";
 }
 
-using Nodes = std::vector<Kesta::platform::InstrumentationNode>;
-using Parse = std::function<Nodes(const std::string&)>;
-
-// Parses `text` again and again; N is the number of nodes. The nodes are checked against
-// parseNodeSnapshot's once, before the timing. `start` runs before that first call.
-void registerParse(
-    const std::string& name, const std::string& text, Parse parse,
-    const std::function<void()>& start = [] {}) {
-  const Nodes expected = Kesta::platform::parseNodeSnapshot(text);
-  const int count = static_cast<int>(expected.size());
+// Parses `text` again and again; N is the number of nodes.
+void registerParse(const std::string& name, const std::string& text) {
+  const auto parse = [](const std::string& json) {
+    return Kesta::platform::parseNodeSnapshot(json);
+  };
+  const int count = static_cast<int>(parse(text).size());
   benchmark::RegisterBenchmark(
       (name + "/" + std::to_string(count)).c_str(),
-      [text, parse, expected, count, name, start](benchmark::State& state) {
-        start();
-        const std::int64_t before = bench::bytesInUse();
-        if (parse(text) != expected) {
-          state.SkipWithError((name + " read other nodes than parseNodeSnapshot").c_str());
-          return;
-        }
-        // What the first call left allocated: buffers kept for the next calls.
-        const std::int64_t kept = bench::bytesInUse() - before;
+      [text, parse, count](benchmark::State& state) {
         bench::HeapCost heap;
         for (int i = 0; i < 3; ++i) {
           const bench::HeapCost one = bench::measureHeap([&] { return parse(text).size(); });
@@ -453,7 +437,6 @@ void registerParse(
         state.counters["lights"] = count;
         state.counters["allocs"] = static_cast<double>(heap.allocations);
         state.counters["peak_B"] = static_cast<double>(heap.peakAbove);
-        state.counters["kept_B"] = static_cast<double>(kept);
         state.counters["MB_per_s"] = benchmark::Counter(
             static_cast<double>(text.size()) * static_cast<double>(state.iterations()) / 1e6,
             benchmark::Counter::kIsRate);
@@ -464,23 +447,7 @@ void registerParse(
 
 void registerParsers(const std::string& prefix) {
   for (const std::string& text : {treeText(4096), largeTreeText(65537)}) {
-    registerParse(prefix + "Parse.Hand", text,
-                  [](const std::string& json) { return Kesta::platform::parseNodeSnapshot(json); });
-#if BLUELIGHT_BENCH_SIMDJSON
-    for (const auto& [suffix, use] : {std::make_pair("", bench::ParserUse::kKept),
-                                      std::make_pair("Fresh", bench::ParserUse::kFresh)}) {
-      registerParse(
-          prefix + "Parse.Simdjson" + suffix, text,
-          [use = use](const std::string& json) {
-            Nodes nodes;
-            if (!bench::readSnapshotWithSimdjson(json, nodes, use)) {
-              throw std::runtime_error("the simdjson reader refused the tree");
-            }
-            return nodes;
-          },
-          bench::releaseKeptParser);
-    }
-#endif
+    registerParse(prefix + "Parse", text);
   }
 }
 
