@@ -8,6 +8,9 @@
 //   walk   the platform opening an instrumentation cursor on the same JSON tree and walking its
 //          nodes (what reading the hardware costs).
 //
+// Beside them the snapshot parser (parseNodeSnapshot) is measured on its own, on the text of
+// Walk/4096's tree (4,608 nodes) and of a tree of 65,537 nodes.
+//
 // The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
 // itself twice: once with the sink "none" and once with every line written to a file. Each run
 // measures the floor and the walk again, so every ratio compares figures taken side by side. The
@@ -45,6 +48,7 @@
 #include "AllocCounter.h"
 #include "KestaInstrumentation.h"
 #include "cmpihost/cmpihost.h"
+#include "instrumentation/json/SnapshotParser.h"
 
 namespace {
 
@@ -387,6 +391,67 @@ Operation walk() {
 }
 
 // ---------------------------------------------------------------------------------------------
+// The snapshot parser
+// ---------------------------------------------------------------------------------------------
+
+// The text of Walk/`lights`'s tree, as the provider reads it.
+std::string treeText(int lights) {
+  std::ifstream in(treeFile(lights));
+  std::ostringstream text;
+  text << in.rdbuf();
+  return text.str();
+}
+
+// A tree of `count` nodes, three in four of them blue lights, every one with a status and the
+// alarm state (the shape of the large trees in the platform's tests).
+std::string largeTreeText(int count) {
+  std::string text = "{\"nodes\": [\n";
+  for (int i = 0; i < count; ++i) {
+    text += (i == 0 ? "" : ",\n");
+    text += "{\"type\": " + std::string(i % 4 != 3 ? "26" : "7") + ", \"path\": \"1." +
+            std::to_string(i) + "\", \"description\": \"Blue Light\", \"status\": " +
+            std::to_string(i % 2 == 0 ? 1 : 20) +
+            ", \"properties\": {\"1\": " + std::to_string(1 + i % 3) + "}}";
+  }
+  return text + "\n]}\n";
+}
+
+// Parses `text` again and again; N is the number of nodes.
+void registerParse(const std::string& name, const std::string& text) {
+  const auto parse = [](const std::string& json) {
+    return Kesta::platform::parseNodeSnapshot(json);
+  };
+  const int count = static_cast<int>(parse(text).size());
+  benchmark::RegisterBenchmark(
+      (name + "/" + std::to_string(count)).c_str(),
+      [text, parse, count](benchmark::State& state) {
+        bench::HeapCost heap;
+        for (int i = 0; i < 3; ++i) {
+          const bench::HeapCost one = bench::measureHeap([&] { return parse(text).size(); });
+          heap.allocations = one.allocations;
+          heap.peakAbove = std::max(heap.peakAbove, one.peakAbove);
+        }
+        for (auto _ : state) {
+          benchmark::DoNotOptimize(parse(text));
+        }
+        state.counters["lights"] = count;
+        state.counters["allocs"] = static_cast<double>(heap.allocations);
+        state.counters["peak_B"] = static_cast<double>(heap.peakAbove);
+        state.counters["MB_per_s"] = benchmark::Counter(
+            static_cast<double>(text.size()) * static_cast<double>(state.iterations()) / 1e6,
+            benchmark::Counter::kIsRate);
+      })
+      ->UseRealTime()
+      ->Unit(benchmark::kMicrosecond);
+}
+
+void registerParsers(const std::string& prefix) {
+  for (const std::string& text : {treeText(4096), largeTreeText(65537)}) {
+    registerParse(prefix + "Parse", text);
+  }
+}
+
+// ---------------------------------------------------------------------------------------------
 // Running and recording
 // ---------------------------------------------------------------------------------------------
 
@@ -507,6 +572,7 @@ int runChild() {
     registerOperation(prefix + "Walk", count, walk(), n);
   }
   if (options.sink == "none") {
+    registerParsers(prefix);
     const auto n = static_cast<std::size_t>(kAssociationLights);
     const std::string association = "KESTA_BlueLightElementCapabilities";
     const std::string systemDevice = "KESTA_BlueLightSystemDevice";

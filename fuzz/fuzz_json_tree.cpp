@@ -4,7 +4,8 @@
 // JsonFileSource, walked first over every node and then over the blue lights only, with every
 // getter the collector calls, and finally by the collector itself (setVector). What the cursor
 // saw must be exactly what parseNodeSnapshot makes of the same text, and a text that the parser
-// refuses must make the cursor refuse it too.
+// refuses must make the cursor refuse it too. The parser's reader and its diagnosis of refused
+// texts must agree: a refused text has a reason, an accepted one has none.
 #include <unistd.h>
 
 #include <cstddef>
@@ -22,6 +23,7 @@
 #include "KestaInstrumentation.h"
 #include "instrumentation/InstrumentationSource.h"
 #include "instrumentation/json/JsonFileSource.h"
+#include "instrumentation/json/SnapshotDiagnosis.h"
 
 namespace {
 
@@ -77,10 +79,16 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
 
   std::vector<Kesta::platform::InstrumentationNode> parsed;
   bool parses = true;
+  std::string reason;
   try {
     parsed = Kesta::platform::parseNodeSnapshot(text);
-  } catch (const Kesta::platform::SourceError&) {
+  } catch (const Kesta::platform::SourceError& error) {
     parses = false;
+    reason = error.what();
+  }
+  if (Kesta::platform::snapshotProblem(text) != reason) {
+    fail(parses ? "the diagnosis finds a problem in a tree that the reader accepts"
+                : "the reader refused a tree without the diagnosis' reason");
   }
 
   std::unique_ptr<Kesta::Instrumentation> cursor;

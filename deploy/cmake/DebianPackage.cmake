@@ -47,8 +47,8 @@ if(BLUELIGHT_DPKG_SHLIBDEPS AND BLUELIGHT_FILE_PROGRAM)
   set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 else()
   message(STATUS "dpkg-shlibdeps or file not found: the Debian package depends on libc6, "
-                 "libgcc-s1 and libstdc++6 without versions")
-  set(CPACK_DEBIAN_PACKAGE_DEPENDS "libc6, libgcc-s1, libstdc++6")
+                 "libgcc-s1, libstdc++6 and libsimdjson14 without versions")
+  set(CPACK_DEBIAN_PACKAGE_DEPENDS "libc6, libgcc-s1, libstdc++6, libsimdjson14")
 endif()
 
 # The example configuration is the administrator's to change: a conffile, kept on upgrade.

@@ -131,8 +131,8 @@ std::set<std::string> expectedFiles() {
     files.insert(std::string(BLUELIGHT_DEPLOY_FULL_DOC_DIR) + "/" + doc);
   }
   // One caption catalogue per language the platform has a translation for.
-  for (const auto& entry :
-       fs::directory_iterator(std::string(BLUELIGHT_DEPLOY_PROJECT_SOURCE_DIR) + "/platform/locale/po")) {
+  for (const auto& entry : fs::directory_iterator(std::string(BLUELIGHT_DEPLOY_PROJECT_SOURCE_DIR) +
+                                                  "/platform/locale/po")) {
     if (entry.path().extension() != ".po") continue;
     files.insert(std::string(BLUELIGHT_DEPLOY_FULL_LOCALEDIR) + "/" + entry.path().stem().string() +
                  "/LC_MESSAGES/bluelightprofileprovider.mo");
@@ -164,6 +164,14 @@ TEST_F(DebianPackage, DependsOnTheCAndCxxRuntimes) {
   const std::string& depends = package().fields.at("Depends");
   EXPECT_TRUE(std::regex_search(depends, std::regex(R"((^|, )libc6( |,|$))"))) << depends;
   EXPECT_TRUE(std::regex_search(depends, std::regex(R"((^|, )libstdc\+\+6( |,|$))"))) << depends;
+}
+
+// The JSON snapshot reader links Debian's simdjson, whose package is named after its SONAME.
+TEST_F(DebianPackage, DependsOnSimdjson) {
+  ASSERT_NE(package().fields.count("Depends"), 0u);
+  const std::string& depends = package().fields.at("Depends");
+  EXPECT_TRUE(std::regex_search(depends, std::regex(R"((^|, )libsimdjson[0-9]+( |,|$))")))
+      << depends;
 }
 
 TEST_F(DebianPackage, TheConfigurationIsAConffile) {

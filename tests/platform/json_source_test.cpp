@@ -16,6 +16,7 @@
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/json/JsonFileSource.h"
+#include "instrumentation/json/SnapshotDiagnosis.h"
 #include "text/Text.h"
 
 namespace {
@@ -548,6 +549,9 @@ TEST(JsonSource, AgreesWithNlohmannOnDamagedInput) {
       reason = error.what();
     }
     const bool ourSyntaxError = reason.rfind("it is not valid JSON: ", 0) == 0;
+    // The reader refuses, the diagnosis explains: both must see the same texts as wrong, or a
+    // refusal would go out without its reason.
+    ASSERT_EQ(Kesta::platform::snapshotProblem(text), reason) << Kesta::platform::printable(text);
     if (text.find('\0') != std::string::npos) {
       // A raw NUL byte is never valid JSON; nlohmann takes it for the end of the input and
       // judges only what stands before it, so it is no oracle here.

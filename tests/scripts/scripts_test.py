@@ -133,7 +133,9 @@ class EnsurePackagesTest(ScriptTest):
         install = self.calls("apt-get")[-1].split()
         self.assertEqual(install[:5], ["apt-get", "install", "-y", "-qq", "--no-install-recommends"])
         self.assertEqual(install[5:], packages_of("demo"))
-        self.assertEqual(packages_of("demo"), ["cmake", "g++", "make", "nlohmann-json3-dev", "gettext"])
+        self.assertEqual(
+            packages_of("demo"), ["cmake", "g++", "make", "nlohmann-json3-dev", "gettext", "libsimdjson-dev"]
+        )
 
     def test_each_command_includes_the_lists_it_builds_on(self):
         for group, expected in (
