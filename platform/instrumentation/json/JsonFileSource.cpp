@@ -614,7 +614,7 @@ std::vector<InstrumentationNode> parseNodeSnapshot(std::string_view json) {
 }
 
 std::vector<InstrumentationNode> JsonFileSource::readNodes() const {
-  const ReadResult read = readRegularFile(path_, kJsonSnapshotLimit);
+  const ReadResult read = readRegularFile(*files_, path_, kJsonSnapshotLimit);
   if (!read.ok()) {
     throw SourceError(read.reason);
   }
