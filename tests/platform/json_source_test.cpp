@@ -39,19 +39,6 @@ constexpr auto kBlueLight = NodeLexicon::NODE_TYPE_BLUE_LIGHT;
 constexpr auto kAlarmState = NodeLexicon::PROPERTY_ALARM_STATE;
 const std::string kFixtures = PLATFORM_TEST_FIXTURES;
 
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool kInstrumentedBuild = true;
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer) || \
-    __has_feature(memory_sanitizer)
-constexpr bool kInstrumentedBuild = true;
-#else
-constexpr bool kInstrumentedBuild = false;
-#endif
-#else
-constexpr bool kInstrumentedBuild = false;
-#endif
-
 // The same snapshot read the slow, obvious way through nlohmann's document model: an oracle for
 // the streaming reader on valid input.
 std::vector<InstrumentationNode> parseWithDocumentModel(const std::string& text) {
@@ -691,12 +678,10 @@ TEST(JsonSource, LargeTrees) {
     std::cout << "[ timing ] " << count << " nodes (" << text.size() / 1024
               << " KiB): cursor opened in " << cursorMs << " ms (best of 5); document-model "
               << "parse of the same text " << documentMs << " ms\n";
+    // Reported, not judged: a loaded machine or a sanitizer makes any bound on wall time fail
+    // for reasons of its own. The benchmarks (scripts/bench.sh) hold an operation, the reading
+    // of the tree included, to its targets.
     RecordProperty("nodes_" + std::to_string(count) + "_cursor_ms", std::to_string(cursorMs));
-    // Generous: this runs on every CIM operation and takes some tens of milliseconds. Sanitizer
-    // builds run many times slower, so only the plain build is held to it.
-    if (!kInstrumentedBuild) {
-      EXPECT_LT(cursorMs, 1000.0);
-    }
   }
 }
 
