@@ -24,6 +24,8 @@
 #include "ManualClock.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiCredentials.h"
+#include "instrumentation/ipmi/IpmiLanTransport.h"
 #include "instrumentation/ipmi/IpmiSource.h"
 
 namespace {
@@ -233,6 +235,25 @@ TEST_F(IpmiSimulatorTest, ABmcThatNeverAnsweredIsDegradedWithinTheTimeout) {
                                      "\" cannot read the identify light: no session with the BMC "
                                      "(it does not answer, or does not accept the login) within "
                                      "300 ms"});
+}
+
+TEST_F(IpmiSimulatorTest, TheNetworkTransportMeasuresTheDeadlineByItsOwnClock) {
+  IpmiSimulator bmc;
+  Kesta::platform::IpmiLanTarget target;
+  target.host = "127.0.0.1";
+  target.port = bmc.port();
+  target.credentials = Kesta::platform::readIpmiCredentials(bmc.readerCredentials());
+  const auto clock = std::make_shared<ManualClock>();
+  const Kesta::platform::IpmiLanTransport transport(std::move(target), clock);
+  const IpmiRequest getChassisStatus{0x00, 0x01, {}};
+  // The deadline has come by the transport's clock. A transport that read the steady clock
+  // instead would see hours left (unless the machine has been up for 1000 hours).
+  const IpmiResponse late = transport.transact(getChassisStatus, clock->now());
+  EXPECT_FALSE(late.answered);
+  EXPECT_TRUE(late.timedOut);
+  EXPECT_EQ(late.failure, "no time was left to ask the BMC");
+  const IpmiResponse inTime = transport.transact(getChassisStatus, clock->now() + 1s);
+  EXPECT_TRUE(inTime.answered) << inTime.failure;
 }
 
 TEST_F(IpmiSimulatorTest, AWrongPasswordIsDegradedAndNeverLogged) {
