@@ -39,6 +39,7 @@ std::optional<std::string> languageCode(std::string_view value);
 class CatalogueCache {
  public:
   explicit CatalogueCache(std::shared_ptr<FileSystem> files = systemFileSystem());
+  ~CatalogueCache() = default;
   CatalogueCache(const CatalogueCache&) = delete;
   CatalogueCache& operator=(const CatalogueCache&) = delete;
 

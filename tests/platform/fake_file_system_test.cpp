@@ -210,7 +210,7 @@ TEST(FakeFileSystem, SizesThatAreOnlyHintsAndFilesThatGrow) {
   // A sysfs attribute reports 4096 bytes whatever it holds.
   files.addFile("/sys/a/brightness", "0\n");
   files.changeStatus("/sys/a/brightness", [](struct stat& info) { info.st_size = 4096; });
-  EXPECT_EQ(readRegularFile(files, "/sys/a/brightness", 64 * 1024).data, "0\n");
+  EXPECT_EQ(readRegularFile(files, "/sys/a/brightness", std::size_t{64} * 1024).data, "0\n");
   // A file that reports less than it holds is still held to the limit.
   files.addFile("/proc/big", std::string(100, 'x'));
   files.changeStatus("/proc/big", [](struct stat& info) { info.st_size = 0; });

@@ -4,7 +4,6 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <filesystem>
 #include <stdexcept>
 
@@ -137,7 +136,8 @@ void FakeFileSystem::addEntry(const std::string& path, Entry entry) {
         folder.inode = nextInode_++;
       }
     }
-    parent = parent.empty() || parent == "/" ? "/" + part : parent + "/" + part;
+    parent += "/";
+    parent += part;
   }
   entry.owner = ::geteuid();
   const auto existing = entries_.find(name);
@@ -407,7 +407,7 @@ long FakeFileSystem::read(int fd, char* buffer, std::size_t size) {
   const std::string& content = entry->second.content;
   const std::size_t from = std::min(open.offset, content.size());
   const std::size_t length = std::min(size, content.size() - from);
-  std::memcpy(buffer, content.data() + from, length);
+  std::copy_n(content.data() + from, length, buffer);
   open.offset = from + length;
   return static_cast<long>(length);
 }
