@@ -5,10 +5,10 @@
 #include <mutex>
 
 #include "KestaCommonBase.h"
-#include "os/FileIo.h"
 #include "instrumentation/ipmi/IpmiSource.h"
 #include "instrumentation/json/JsonFileSource.h"
 #include "instrumentation/leds/SysfsLedSource.h"
+#include "os/FileIo.h"
 #include "text/Text.h"
 
 namespace Kesta {
@@ -64,7 +64,7 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
       "ipmi-lan:<host>?credentials=<file>)");
 }
 
-SourceSetting configuredSource() {
+SourceSetting configuredSource(FileSystem& files) {
   if (const char* variable = std::getenv("KESTA_INSTRUMENTATION"); variable != nullptr) {
     std::string text = stripSpaces(variable);
     if (!text.empty()) {
@@ -72,7 +72,7 @@ SourceSetting configuredSource() {
     }
   }
   const std::string file = configurationFile();
-  ReadResult read = readRegularFile(file, kConfigurationFileLimit);
+  ReadResult read = readRegularFile(files, file, kConfigurationFileLimit);
   if (read.error == ENOENT || read.error == ENOTDIR) {
     return {kDefaultSourceText, "default"};
   }
@@ -87,6 +87,8 @@ SourceSetting configuredSource() {
   }
   return {std::move(firstLine), file};
 }
+
+SourceSetting configuredSource() { return configuredSource(*systemFileSystem()); }
 
 void setConfigurationFileForTesting(const std::string& path) {
   std::lock_guard<std::mutex> lock(configurationFileMutex);

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "instrumentation/SourceError.h"
+#include "os/FileSystem.h"
 
 namespace Kesta {
 namespace platform {
@@ -71,7 +72,9 @@ constexpr const char* kDefaultConfigurationFile = "/etc/kesta/instrumentation.co
 
 // KESTA_INSTRUMENTATION when set and not blank, else the first line of the configuration file
 // when that exists, else kDefaultSourceText. Throws SourceError when the configuration file
-// exists but cannot be read or its first line is blank.
+// exists but cannot be read or its first line is blank. The file is read through `files`.
+SourceSetting configuredSource(FileSystem& files);
+// The same through the real file system.
 SourceSetting configuredSource();
 
 // Points configuredSource() at another configuration file; an empty path restores the default.

@@ -41,74 +41,8 @@ constexpr std::array<BuiltInText, 1> kBuiltInEnglish = {{
 
 bool isRegularFile(const std::string& path) {
   struct stat info = {};
-  return ::stat(path.c_str(), &info) == 0 && S_ISREG(info.st_mode);
+  return systemFileSystem()->statAt(kWorkingDirectory, path, info) == 0 && S_ISREG(info.st_mode);
 }
-
-// What identifies one version of a file well enough to reuse what was parsed from it.
-struct FileStamp {
-  dev_t device = 0;
-  ino_t inode = 0;
-  off_t size = 0;
-  long long modifiedSeconds = 0;
-  long modifiedNanoseconds = 0;
-
-  explicit FileStamp(const struct stat& info)
-      : device(info.st_dev),
-        inode(info.st_ino),
-        size(info.st_size),
-        modifiedSeconds(info.st_mtim.tv_sec),
-        modifiedNanoseconds(info.st_mtim.tv_nsec) {}
-
-  friend bool operator==(const FileStamp& a, const FileStamp& b) {
-    return a.device == b.device && a.inode == b.inode && a.size == b.size &&
-           a.modifiedSeconds == b.modifiedSeconds && a.modifiedNanoseconds == b.modifiedNanoseconds;
-  }
-};
-
-class CatalogueCache {
- public:
-  std::shared_ptr<const MoCatalogue> get(const std::string& path) {
-    struct stat info = {};
-    if (::stat(path.c_str(), &info) != 0 || !S_ISREG(info.st_mode)) {
-      return nullptr;
-    }
-    const FileStamp current(info);
-    {
-      std::lock_guard<std::mutex> lock(mutex_);
-      const auto found = entries_.find(path);
-      if (found != entries_.end() && found->second.stamp == current) {
-        return found->second.catalogue;
-      }
-    }
-    // Read and parse without holding the lock; two threads may both load a changed file, and
-    // the later one simply replaces the earlier entry.
-    const ReadResult read = readRegularFile(path, kCatalogueLimit);
-    std::shared_ptr<const MoCatalogue> catalogue;
-    if (read.ok()) {
-      if (std::optional<MoCatalogue> parsed = MoCatalogue::parse(read.data)) {
-        catalogue = std::make_shared<const MoCatalogue>(std::move(*parsed));
-      }
-    }
-    // A file that is not a catalogue is remembered too, so it is not parsed again on every
-    // lookup until it changes.
-    const FileStamp stamp = read.ok() ? FileStamp(read.info) : current;
-    std::lock_guard<std::mutex> lock(mutex_);
-    if (entries_.size() >= kMaxCachedCatalogues && entries_.count(path) == 0) {
-      entries_.clear();
-    }
-    entries_.insert_or_assign(path, Entry{stamp, catalogue});
-    return catalogue;
-  }
-
- private:
-  struct Entry {
-    FileStamp stamp;
-    std::shared_ptr<const MoCatalogue> catalogue;  // null: the file is not a catalogue
-  };
-
-  std::mutex mutex_;
-  std::unordered_map<std::string, Entry> entries_;  // guarded by mutex_
-};
 
 CatalogueCache& catalogueCache() {
   static CatalogueCache cache;
@@ -142,8 +76,55 @@ std::optional<std::wstring> translatedText(const std::wstring& resourceLibrary,
 
 }  // namespace
 
-std::string messageDomain() { return BLUELIGHT_MESSAGE_DOMAIN; }
+CatalogueCache::FileStamp::FileStamp(const struct stat& info)
+    : device(info.st_dev),
+      inode(info.st_ino),
+      size(info.st_size),
+      modifiedSeconds(info.st_mtim.tv_sec),
+      modifiedNanoseconds(info.st_mtim.tv_nsec) {}
 
+bool CatalogueCache::FileStamp::operator==(const FileStamp& other) const {
+  return device == other.device && inode == other.inode && size == other.size &&
+         modifiedSeconds == other.modifiedSeconds &&
+         modifiedNanoseconds == other.modifiedNanoseconds;
+}
+
+CatalogueCache::CatalogueCache(std::shared_ptr<FileSystem> files) : files_(std::move(files)) {}
+
+std::shared_ptr<const MoCatalogue> CatalogueCache::get(const std::string& path) {
+  struct stat info = {};
+  if (files_->statAt(kWorkingDirectory, path, info) != 0 || !S_ISREG(info.st_mode)) {
+    return nullptr;
+  }
+  const FileStamp current(info);
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    const auto found = entries_.find(path);
+    if (found != entries_.end() && found->second.stamp == current) {
+      return found->second.catalogue;
+    }
+  }
+  // Read and parse without holding the lock; two threads may both load a changed file, and
+  // the later one simply replaces the earlier entry.
+  const ReadResult read = readRegularFile(*files_, path, kCatalogueLimit);
+  std::shared_ptr<const MoCatalogue> catalogue;
+  if (read.ok()) {
+    if (std::optional<MoCatalogue> parsed = MoCatalogue::parse(read.data)) {
+      catalogue = std::make_shared<const MoCatalogue>(std::move(*parsed));
+    }
+  }
+  // A file that is not a catalogue is remembered too, so it is not parsed again on every
+  // lookup until it changes.
+  const FileStamp stamp = read.ok() ? FileStamp(read.info) : current;
+  std::lock_guard<std::mutex> lock(mutex_);
+  if (entries_.size() >= kMaxCachedCatalogues && entries_.count(path) == 0) {
+    entries_.clear();
+  }
+  entries_.insert_or_assign(path, Entry{stamp, catalogue});
+  return catalogue;
+}
+
+std::string messageDomain() { return BLUELIGHT_MESSAGE_DOMAIN; }
 
 std::vector<std::string> catalogueDirectories(const std::string& binaryDirectory) {
   std::vector<std::string> directories;

@@ -36,18 +36,18 @@ std::string errorText(int error) {
   return text != nullptr ? std::string(text) : "error " + std::to_string(error);
 }
 
-ReadResult readRegularFile(int dirFd, const std::string& path, std::size_t limit) {
-  // O_NONBLOCK keeps open() itself from waiting for a writer when the path is a FIFO; the file
-  // type is checked right after.
-  UniqueFd fd(::openat(dirFd, path.c_str(), O_RDONLY | O_CLOEXEC | O_NOCTTY | O_NONBLOCK));
-  if (!fd) {
-    const int error = errno;
-    return failure(error, errorText(error));
+ReadResult readRegularFile(FileSystem& files, int dirFd, const std::string& path,
+                           std::size_t limit) {
+  // Opening never waits for a writer when the path is a FIFO; the file type is checked right
+  // after.
+  const int opened = files.openForReading(dirFd, path);
+  if (opened < 0) {
+    return failure(-opened, errorText(-opened));
   }
+  const FileSystemFd fd(files, opened);
   struct stat info = {};
-  if (::fstat(fd.get(), &info) != 0) {
-    const int error = errno;
-    return failure(error, errorText(error));
+  if (const int examined = files.fstat(fd.get(), info); examined < 0) {
+    return failure(-examined, errorText(-examined));
   }
   if (S_ISDIR(info.st_mode)) {
     return failure(EISDIR, "it is a directory");
@@ -73,13 +73,12 @@ ReadResult readRegularFile(int dirFd, const std::string& path, std::size_t limit
       }
       result.data.resize(std::min<std::size_t>(std::max<std::size_t>(used * 2, 4096), cap));
     }
-    const ssize_t got = ::read(fd.get(), &result.data[used], result.data.size() - used);
+    const long got = files.read(fd.get(), &result.data[used], result.data.size() - used);
     if (got < 0) {
-      if (errno == EINTR) {
+      if (got == -EINTR) {
         continue;
       }
-      const int error = errno;
-      return failure(error, errorText(error));
+      return failure(static_cast<int>(-got), errorText(static_cast<int>(-got)));
     }
     if (got == 0) {
       break;
@@ -90,8 +89,16 @@ ReadResult readRegularFile(int dirFd, const std::string& path, std::size_t limit
   return result;
 }
 
+ReadResult readRegularFile(FileSystem& files, const std::string& path, std::size_t limit) {
+  return readRegularFile(files, kWorkingDirectory, path, limit);
+}
+
+ReadResult readRegularFile(int dirFd, const std::string& path, std::size_t limit) {
+  return readRegularFile(*systemFileSystem(), dirFd, path, limit);
+}
+
 ReadResult readRegularFile(const std::string& path, std::size_t limit) {
-  return readRegularFile(AT_FDCWD, path, limit);
+  return readRegularFile(*systemFileSystem(), kWorkingDirectory, path, limit);
 }
 
 bool writeAll(int fd, const char* data, std::size_t size) noexcept {

@@ -1,5 +1,6 @@
 // Small wrappers around the file system calls that the platform layer needs: an owning file
-// descriptor and whole-file reads that refuse anything that could block or never end.
+// descriptor and whole-file reads that refuse anything that could block or never end. The reads
+// go through a FileSystem (os/FileSystem.h), the real one unless the caller names another.
 #ifndef KESTA_PLATFORM_OS_FILEIO_H
 #define KESTA_PLATFORM_OS_FILEIO_H
 
@@ -7,6 +8,8 @@
 
 #include <cstddef>
 #include <string>
+
+#include "os/FileSystem.h"
 
 namespace Kesta {
 namespace platform {
@@ -51,10 +54,15 @@ struct ReadResult {
   bool ok() const { return error == 0; }
 };
 
-// Reads the whole regular file at `path` (relative paths are taken from `dirFd`, which may be
-// AT_FDCWD). Directories, FIFOs, devices and sockets are refused, because reading them can block
-// for ever or never end; so are files larger than `limit` bytes. The length reported by stat is
-// only a hint: sysfs attributes report 4096 whatever they hold, so the file is read to its end.
+// Reads the whole regular file at `path` through `files` (relative paths are taken from `dirFd`,
+// a directory descriptor of `files` or kWorkingDirectory). Directories, FIFOs, devices and
+// sockets are refused, because reading them can block for ever or never end; so are files larger
+// than `limit` bytes. The length reported by stat is only a hint: sysfs attributes report 4096
+// whatever they hold, so the file is read to its end.
+ReadResult readRegularFile(FileSystem& files, int dirFd, const std::string& path,
+                           std::size_t limit);
+ReadResult readRegularFile(FileSystem& files, const std::string& path, std::size_t limit);
+// The same through the real file system (`dirFd` a real descriptor or AT_FDCWD).
 ReadResult readRegularFile(int dirFd, const std::string& path, std::size_t limit);
 ReadResult readRegularFile(const std::string& path, std::size_t limit);
 

@@ -12,23 +12,31 @@
  *   Get Chassis Status (NetFn 00h, cmd 01h):
  *     power on, no last power event, misc byte = 40h | state << 4 (state reported)
  *
+ * The seconds of an interval are those of a clock of the plug-in's own, which moves only when a
+ * test says so, with a command no real BMC has:
+ *   Let Time Pass (NetFn 30h, OEM, cmd 01h), data [seconds]: the clock moves on by that many
+ *     seconds; an interval that has run its time is over.
+ * So a test sees a light that is on for an interval, and then off by itself, without waiting
+ * for real seconds and without depending on how fast the machine runs it.
+ *
  * The options string of the loadlib line makes Get Chassis Status misbehave, for the tests of
  * how the source copes with a BMC that answers badly:
  *   "reply=short"      answer with the completion code and two bytes only
  *   "reply=cc:<hex>"   answer with that completion code alone, e.g. "reply=cc:c0"
  *   "" or absent       answer properly
- * Chassis Identify works in every mode, so a test can tell the answers apart.
+ * Chassis Identify and Let Time Pass work in every mode, so a test can tell the answers apart.
  */
 #include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
-#include <sys/time.h>
 
 #include <OpenIPMI/mcserv.h>
 
 #define CHASSIS_NETFN 0x00
 #define GET_CHASSIS_STATUS_CMD 0x01
 #define CHASSIS_IDENTIFY_CMD 0x04
+#define OEM_NETFN 0x30
+#define LET_TIME_PASS_CMD 0x01
 
 #define CC_OK 0x00
 #define CC_REQUEST_DATA_LENGTH_INVALID 0xc7
@@ -40,10 +48,9 @@ enum identify_state { IDENTIFY_OFF = 0, IDENTIFY_TIMED = 1, IDENTIFY_INDEFINITE 
 
 enum reply_mode { REPLY_PROPER, REPLY_SHORT, REPLY_COMPLETION_CODE };
 
-/* ipmi_sim runs every handler and timer on its one thread, so plain statics are enough. */
-static sys_data_t* simulator;
-static ipmi_timer_t* identify_timer;
+/* ipmi_sim runs every handler on its one thread, so plain statics are enough. */
 static enum identify_state identify = IDENTIFY_OFF;
+static unsigned int identify_seconds_left; /* while IDENTIFY_TIMED */
 static enum reply_mode reply = REPLY_PROPER;
 static unsigned char reply_completion_code = CC_OK;
 
@@ -52,11 +59,25 @@ static unsigned char reply_completion_code = CC_OK;
 SIM_EXPORT int ipmi_sim_module_print_version(sys_data_t* sys, char* options);
 SIM_EXPORT int ipmi_sim_module_init(sys_data_t* sys, const char* options);
 
-static void identify_expired(void* cb_data) {
+static void handle_let_time_pass(lmc_data_t* mc, msg_t* msg, unsigned char* rdata,
+                                 unsigned int* rdata_len, void* cb_data) {
+  (void)mc;
   (void)cb_data;
-  if (identify == IDENTIFY_TIMED) {
-    identify = IDENTIFY_OFF;
+  if (msg->len != 1) {
+    rdata[0] = CC_REQUEST_DATA_LENGTH_INVALID;
+    *rdata_len = 1;
+    return;
   }
+  if (identify == IDENTIFY_TIMED) {
+    if (msg->data[0] >= identify_seconds_left) {
+      identify = IDENTIFY_OFF;
+      identify_seconds_left = 0;
+    } else {
+      identify_seconds_left -= msg->data[0];
+    }
+  }
+  rdata[0] = CC_OK;
+  *rdata_len = 1;
 }
 
 static void handle_get_chassis_status(lmc_data_t* mc, msg_t* msg, unsigned char* rdata,
@@ -103,17 +124,14 @@ static void handle_chassis_identify(lmc_data_t* mc, msg_t* msg, unsigned char* r
     force = msg->data[1] & 0x01;
   }
 
-  simulator->stop_timer(identify_timer);
+  identify_seconds_left = 0;
   if (force) {
     identify = IDENTIFY_INDEFINITE;
   } else if (seconds == 0) {
     identify = IDENTIFY_OFF;
   } else {
-    struct timeval interval;
-    interval.tv_sec = (time_t)seconds;
-    interval.tv_usec = 0;
     identify = IDENTIFY_TIMED;
-    simulator->start_timer(identify_timer, &interval);
+    identify_seconds_left = seconds;
   }
   rdata[0] = CC_OK;
   *rdata_len = 1;
@@ -150,15 +168,10 @@ int ipmi_sim_module_print_version(sys_data_t* sys, char* options) {
 
 int ipmi_sim_module_init(sys_data_t* sys, const char* options) {
   int rv;
+  (void)sys;
   if (parse_options(options) != 0) {
     fprintf(stderr, "identify plug-in: options \"%s\" not understood\n", options);
     return -1;
-  }
-  simulator = sys;
-  rv = sys->alloc_timer(sys, identify_expired, NULL, &identify_timer);
-  if (rv != 0) {
-    fprintf(stderr, "identify plug-in: cannot allocate the identify timer (%d)\n", rv);
-    return rv;
   }
   rv = ipmi_emu_register_cmd_handler(CHASSIS_NETFN, GET_CHASSIS_STATUS_CMD,
                                      handle_get_chassis_status, NULL);
@@ -166,8 +179,11 @@ int ipmi_sim_module_init(sys_data_t* sys, const char* options) {
     rv = ipmi_emu_register_cmd_handler(CHASSIS_NETFN, CHASSIS_IDENTIFY_CMD, handle_chassis_identify,
                                        NULL);
   }
+  if (rv == 0) {
+    rv = ipmi_emu_register_cmd_handler(OEM_NETFN, LET_TIME_PASS_CMD, handle_let_time_pass, NULL);
+  }
   if (rv != 0) {
-    fprintf(stderr, "identify plug-in: cannot register the chassis handlers (%d)\n", rv);
+    fprintf(stderr, "identify plug-in: cannot register the command handlers (%d)\n", rv);
   }
   return rv;
 }

@@ -48,7 +48,8 @@ foreach(unit IN LISTS IPMI_TEST_UNITS)
     IPMI_TEST_LAN_PLUGIN="${_ipmi_lan_plugin}"
     IPMI_TEST_PROVIDER_LIBRARY="$<TARGET_FILE:bluelightprofileprovider>")
   target_link_libraries(${target} PRIVATE
-    bluelight_platform test_support GTest::gtest GTest::gtest_main Threads::Threads)
+    bluelight_platform platform_test_seams test_support GTest::gtest GTest::gtest_main
+    Threads::Threads)
   if(BLUELIGHT_OPENIPMI_SERVER_INCLUDE)
     add_dependencies(${target} bluelight_identify_sim)
   endif()

@@ -1,5 +1,6 @@
 // The in-band transport up to the ioctl boundary: a fake stands in for open, ioctl, poll and
-// close, plays the kernel's part and records what the transport asked of it.
+// close, plays the kernel's part and records what the transport asked of it. Time is a
+// ManualClock that moves only while the fake's poll() "waits", so deadlines are met exactly.
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <linux/ipmi.h>
@@ -19,6 +20,7 @@
 #include <thread>
 #include <vector>
 
+#include "ManualClock.h"
 #include "instrumentation/ipmi/IpmiDeviceTransport.h"
 
 namespace {
@@ -29,6 +31,7 @@ using Kesta::platform::IpmiDeviceOs;
 using Kesta::platform::IpmiDeviceTransport;
 using Kesta::platform::IpmiRequest;
 using Kesta::platform::IpmiResponse;
+using platform_test::ManualClock;
 
 using Bytes = std::vector<std::uint8_t>;
 
@@ -60,16 +63,19 @@ class FakeKernel final : public IpmiDeviceOs {
   struct PollStep {
     int result = 1;
     short revents = POLLIN;
+    std::chrono::milliseconds spent{0};  // how long the call took before it returned
   };
 
   // What the calls do; set before the transport runs.
   int openError = 0;               // a negated errno for open, or 0
   std::deque<int> sendResults;     // per send (empty: success)
-  std::deque<PollStep> pollSteps;  // per poll (empty: sleep the whole timeout and report none)
+  std::deque<PollStep> pollSteps;  // per poll (empty: wait the whole timeout and report none)
   std::deque<Incoming> incoming;   // per receive (empty: -EAGAIN)
   // When set, every poll is ready at once and every receive answers the request on that
   // descriptor with this function's bytes (for the concurrency test).
   std::function<Bytes(int fd)> answerEveryRequest;
+  // The clock the transport measures its deadline by; a poll() moves it by the time it waits.
+  std::shared_ptr<ManualClock> clock;
 
   int open(const char* path, int flags) override {
     std::lock_guard<std::mutex> lock(mutex_);
@@ -112,12 +118,12 @@ class FakeKernel final : public IpmiDeviceOs {
       return 1;
     }
     if (pollSteps.empty()) {
-      lock.unlock();
-      std::this_thread::sleep_for(std::chrono::milliseconds(timeoutMilliseconds));
+      clock->advance(std::chrono::milliseconds(timeoutMilliseconds));
       return 0;
     }
     const PollStep step = pollSteps.front();
     pollSteps.pop_front();
+    clock->advance(step.spent);
     fds[0].revents = step.revents;
     return step.result;
   }
@@ -192,10 +198,12 @@ FakeKernel::Incoming failedReceive(int error) {
 
 class IpmiDeviceTransportTest : public ::testing::Test {
  protected:
-  IpmiResponse ask(std::chrono::milliseconds timeout = 1000ms,
+  IpmiDeviceTransportTest() { kernel_->clock = clock_; }
+
+  IpmiResponse ask(IpmiClock::duration timeout = 1000ms,
                    const IpmiRequest& request = kGetChassisStatus) {
-    const IpmiDeviceTransport transport("/dev/ipmi0", kernel_);
-    return transport.transact(request, IpmiClock::now() + timeout);
+    const IpmiDeviceTransport transport("/dev/ipmi0", kernel_, clock_);
+    return transport.transact(request, clock_->now() + timeout);
   }
 
   // Every descriptor the transport opened was closed again, once.
@@ -204,6 +212,7 @@ class IpmiDeviceTransportTest : public ::testing::Test {
     EXPECT_EQ(kernel_->closed.size(), kernel_->openedPaths.size() - (kernel_->openError ? 1 : 0));
   }
 
+  std::shared_ptr<ManualClock> clock_ = std::make_shared<ManualClock>();
   std::shared_ptr<FakeKernel> kernel_ = std::make_shared<FakeKernel>();
 };
 
@@ -238,9 +247,8 @@ TEST_F(IpmiDeviceTransportTest, SendsGetChassisStatusToTheBmcAndReturnsTheAnswer
 TEST_F(IpmiDeviceTransportTest, PassesRequestDataAndOtherDevices) {
   kernel_->pollSteps = {{}};
   kernel_->incoming = {{0, IPMI_RESPONSE_RECV_TYPE, std::nullopt, 0x07, 0x01, {0x00, 0x20}}};
-  const IpmiDeviceTransport transport("/dev/ipmi3", kernel_);
-  const IpmiResponse response =
-      transport.transact({0x06, 0x01, {0xaa, 0xbb}}, IpmiClock::now() + 1s);
+  const IpmiDeviceTransport transport("/dev/ipmi3", kernel_, clock_);
+  const IpmiResponse response = transport.transact({0x06, 0x01, {0xaa, 0xbb}}, clock_->now() + 1s);
   ASSERT_TRUE(response.answered) << response.failure;
   EXPECT_EQ(kernel_->openedPaths, std::vector<std::string>{"/dev/ipmi3"});
   EXPECT_EQ(kernel_->sent.at(0).netFn, 0x06);
@@ -293,14 +301,13 @@ TEST_F(IpmiDeviceTransportTest, AnInterruptedSendIsRepeated) {
 }
 
 TEST_F(IpmiDeviceTransportTest, NoAnswerEndsAtTheDeadline) {
-  const auto start = std::chrono::steady_clock::now();
   const IpmiResponse response = ask(120ms);
-  const auto took = std::chrono::steady_clock::now() - start;
   EXPECT_FALSE(response.answered);
   EXPECT_TRUE(response.timedOut);
   EXPECT_EQ(response.failure, "no answer from the BMC");
-  EXPECT_GE(took, 110ms);
-  EXPECT_LT(took, 400ms);
+  // One wait for the whole time, and the transport gave up exactly at the deadline.
+  EXPECT_EQ(kernel_->pollTimeouts, std::vector<int>{120});
+  EXPECT_EQ(clock_->elapsed(), 120ms);
   for (const int timeout : kernel_->pollTimeouts) {
     EXPECT_GE(timeout, 0);
     EXPECT_LE(timeout, 120);
@@ -308,9 +315,28 @@ TEST_F(IpmiDeviceTransportTest, NoAnswerEndsAtTheDeadline) {
   expectEverythingClosed();
 }
 
+TEST_F(IpmiDeviceTransportTest, EveryWaitIsForTheTimeLeft) {
+  // A signal after 50 ms, an event after 30 ms more; then nothing until the deadline.
+  kernel_->pollSteps = {{-EINTR, 0, 50ms}, {1, POLLIN, 30ms}};
+  kernel_->incoming = {{0, IPMI_ASYNC_EVENT_RECV_TYPE, std::nullopt, 0x05, 0x02, {0x11}}};
+  const IpmiResponse response = ask(120ms);
+  EXPECT_TRUE(response.timedOut);
+  EXPECT_EQ(kernel_->pollTimeouts, (std::vector<int>{120, 70, 40}));
+  EXPECT_EQ(clock_->elapsed(), 120ms);
+  expectEverythingClosed();
+}
+
+TEST_F(IpmiDeviceTransportTest, APartOfAMillisecondLeftIsWaitedAsAWholeOne) {
+  // Rounding down would make poll() return at once, again and again, until the deadline.
+  const IpmiResponse response = ask(120ms + 400us);
+  EXPECT_TRUE(response.timedOut);
+  EXPECT_EQ(kernel_->pollTimeouts, std::vector<int>{121});
+  EXPECT_EQ(clock_->elapsed(), 121ms);
+}
+
 TEST_F(IpmiDeviceTransportTest, APastDeadlineAsksNothingMore) {
-  const IpmiDeviceTransport transport("/dev/ipmi0", kernel_);
-  const IpmiResponse response = transport.transact(kGetChassisStatus, IpmiClock::now() - 1s);
+  const IpmiDeviceTransport transport("/dev/ipmi0", kernel_, clock_);
+  const IpmiResponse response = transport.transact(kGetChassisStatus, clock_->now() - 1s);
   EXPECT_FALSE(response.answered);
   EXPECT_TRUE(response.timedOut);
   EXPECT_TRUE(kernel_->pollTimeouts.empty());
@@ -385,13 +411,13 @@ TEST_F(IpmiDeviceTransportTest, ConcurrentReadersEachGetTheirOwnAnswer) {
   kernel_->answerEveryRequest = [](int fd) {
     return Bytes{0, 1, 0, static_cast<std::uint8_t>(fd)};
   };
-  const IpmiDeviceTransport transport("/dev/ipmi0", kernel_);
+  const IpmiDeviceTransport transport("/dev/ipmi0", kernel_, clock_);
   std::atomic<int> wrong{0};
   std::vector<std::thread> readers;
   for (int t = 0; t < 8; ++t) {
     readers.emplace_back([&] {
       for (int i = 0; i < 50; ++i) {
-        const IpmiResponse response = transport.transact(kGetChassisStatus, IpmiClock::now() + 1s);
+        const IpmiResponse response = transport.transact(kGetChassisStatus, clock_->now() + 1s);
         if (!response.answered || response.data.size() != 4) {
           ++wrong;
         }

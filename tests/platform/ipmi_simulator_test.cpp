@@ -1,19 +1,32 @@
 // The "ipmi-lan:" source against a real RMCP+ peer: OpenIPMI's BMC simulator on a loopback port,
 // read through the platform cursor exactly as an operation of the provider reads it.
+//
+// Nothing here asserts on wall time. The light's timed state follows the simulated BMC's own
+// clock, which the tests move; a read that runs into its timeout is checked by what the source
+// handed its transport, measured by a ManualClock that no wait moves (the plug-in waits on its
+// own), and by the status and the log line it gives.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <iostream>
+#include <memory>
+#include <mutex>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <thread>
 #include <vector>
 
 #include "IpmiSimulator.h"
 #include "KestaInstrumentation.h"
+#include "ManualClock.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiCredentials.h"
+#include "instrumentation/ipmi/IpmiLanTransport.h"
+#include "instrumentation/ipmi/IpmiSource.h"
 
 namespace {
 
@@ -23,7 +36,13 @@ using ipmi_test::SimulatorOptions;
 using Kesta::Instrumentation;
 using Kesta::NodeLexicon;
 using Kesta::platform::InstrumentationNode;
+using Kesta::platform::InstrumentationSource;
+using Kesta::platform::IpmiClock;
+using Kesta::platform::IpmiRequest;
+using Kesta::platform::IpmiResponse;
+using Kesta::platform::IpmiTransport;
 using Kesta::platform::makeInstrumentationSource;
+using platform_test::ManualClock;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
 using Clock = std::chrono::steady_clock;
@@ -38,8 +57,7 @@ struct Light {
   std::optional<unsigned int> alarmState;
 };
 
-Light readLight() {
-  Instrumentation cursor;
+Light lightOf(Instrumentation& cursor) {
   Light light;
   if (!cursor.selectNode(NodeLexicon::NODE_TYPE_BLUE_LIGHT)) {
     ADD_FAILURE() << "no blue light";
@@ -55,6 +73,63 @@ Light readLight() {
   ++cursor;
   EXPECT_FALSE(static_cast<bool>(cursor)) << "more than one node";
   return light;
+}
+
+// Through the configured source (KESTA_INSTRUMENTATION), as an operation reads it.
+Light readLight() {
+  Instrumentation cursor;
+  return lightOf(cursor);
+}
+
+// Through a given source.
+Light readLight(std::unique_ptr<InstrumentationSource> source) {
+  Instrumentation cursor(std::move(source));
+  return lightOf(cursor);
+}
+
+// The time until the deadline that sources handed their transports, by their clock.
+struct Handed {
+  std::mutex mutex;
+  std::vector<IpmiClock::duration> timeouts;
+};
+
+class RecordingTransport final : public IpmiTransport {
+ public:
+  RecordingTransport(std::unique_ptr<IpmiTransport> transport, std::shared_ptr<ManualClock> clock,
+                     std::shared_ptr<Handed> handed)
+      : transport_(std::move(transport)), clock_(std::move(clock)), handed_(std::move(handed)) {}
+
+  IpmiResponse transact(const IpmiRequest& request, IpmiClock::time_point deadline) const override {
+    {
+      std::lock_guard<std::mutex> lock(handed_->mutex);
+      handed_->timeouts.push_back(deadline - clock_->now());
+    }
+    return transport_->transact(request, deadline);
+  }
+
+ private:
+  std::unique_ptr<IpmiTransport> transport_;
+  std::shared_ptr<ManualClock> clock_;
+  std::shared_ptr<Handed> handed_;
+};
+
+// The source makeIpmiSource makes of `text` ("ipmi-lan:..."), on a ManualClock, with each of its
+// transports recording what it was handed.
+std::unique_ptr<InstrumentationSource> recordedSource(const std::string& text,
+                                                      const std::shared_ptr<Handed>& handed) {
+  using namespace Kesta::platform;
+  const std::string_view scheme = "ipmi-lan:";
+  const IpmiLanSourceSettings settings =
+      parseIpmiLanSource(std::string_view(text).substr(scheme.size()));
+  const auto clock = std::make_shared<ManualClock>();
+  IpmiSourceSystem system;
+  system.clock = clock;
+  return std::make_unique<IpmiSource>(
+      text, ipmiLanPath(settings), settings.options,
+      [transport = ipmiLanTransportFactory(settings, system), clock, handed] {
+        return std::make_unique<RecordingTransport>(transport(), clock, handed);
+      },
+      clock);
 }
 
 class IpmiSimulatorTest : public ::testing::Test {
@@ -81,13 +156,14 @@ TEST_F(IpmiSimulatorTest, TheAlarmStateFollowsChassisIdentify) {
   bmc.identify({0x00});
   EXPECT_EQ(readLight().alarmState, 1u) << "switched off";
 
-  // On for one second: on while it lasts, off by itself afterwards.
-  const Clock::time_point switched = Clock::now();
-  bmc.identify({0x01});
+  // On for two seconds of the BMC's clock: on while they last, off by itself afterwards.
+  bmc.identify({0x02});
   light = readLight();
-  ASSERT_LT(Clock::now() - switched, 900ms) << "too slow to see the timed state";
+  EXPECT_EQ(light.status, 1u);
   EXPECT_EQ(light.alarmState, 3u) << "on for an interval";
-  std::this_thread::sleep_until(switched + 1300ms);
+  bmc.letTimePass(1s);
+  EXPECT_EQ(readLight().alarmState, 3u) << "one second of two has passed";
+  bmc.letTimePass(1s);
   EXPECT_EQ(readLight().alarmState, 1u) << "the interval is over";
 
   EXPECT_TRUE(platform_test::rawLines(capture).empty());
@@ -119,24 +195,26 @@ TEST_F(IpmiSimulatorTest, WithoutTheIdentifyPlugInTheStateIsNotReported) {
 
 TEST_F(IpmiSimulatorTest, AStoppedBmcIsDegradedWithinTheTimeout) {
   IpmiSimulator bmc;
-  ScopedEnv source("KESTA_INSTRUMENTATION", bmc.sourceText("timeout=0.5"));
-  ASSERT_EQ(readLight().status, 1u);  // a session is open now
+  const std::string text = bmc.sourceText("timeout=0.5");
+  const auto handed = std::make_shared<Handed>();
+  ASSERT_EQ(readLight(recordedSource(text, handed)).status, 1u);  // a session is open now
 
   bmc.stop();
   LogCapture capture;
-  const Clock::time_point start = Clock::now();
-  const Light light = readLight();
-  const auto took = Clock::now() - start;
+  const Light light = readLight(recordedSource(text, handed));
   EXPECT_EQ(light.status, 21u);
   EXPECT_FALSE(light.alarmState.has_value());
-  EXPECT_LT(took, 700ms);
+  // Each read handed its transport the whole timeout, and no more.
+  EXPECT_EQ(handed->timeouts, (std::vector<IpmiClock::duration>{500ms, 500ms}));
   const std::vector<std::string> lines = platform_test::rawLines(capture);
   ASSERT_EQ(lines.size(), 1u);
-  EXPECT_EQ(
-      lines[0].rfind(kLogPrefix + "Instrumentation source \"" + bmc.sourceText("timeout=0.5") +
-                         "\" cannot read the identify light: no ",
-                     0),
-      0u)
+  EXPECT_EQ(lines[0].rfind(kLogPrefix + "Instrumentation source \"" + text +
+                               "\" cannot read the identify light: no ",
+                           0),
+            0u)
+      << lines[0];
+  const std::string within = " within 500 ms";
+  EXPECT_EQ(lines[0].substr(lines[0].size() - std::min(lines[0].size(), within.size())), within)
       << lines[0];
   EXPECT_EQ(lines[0].find("reader-pass"), std::string::npos);
 }
@@ -147,11 +225,10 @@ TEST_F(IpmiSimulatorTest, ABmcThatNeverAnsweredIsDegradedWithinTheTimeout) {
   ipmi_test::writePrivateFile(dir.file("bmc.conf"), "user = reader\npassword = reader-pass\n");
   const std::string text = "ipmi-lan:127.0.0.1:" + std::to_string(port) +
                            "?timeout=300ms&credentials=" + dir.file("bmc.conf");
-  ScopedEnv source("KESTA_INSTRUMENTATION", text);
+  const auto handed = std::make_shared<Handed>();
   LogCapture capture;
-  const Clock::time_point start = Clock::now();
-  const Light light = readLight();
-  EXPECT_LT(Clock::now() - start, 500ms);
+  const Light light = readLight(recordedSource(text, handed));
+  EXPECT_EQ(handed->timeouts, std::vector<IpmiClock::duration>{300ms});
   EXPECT_EQ(light.status, 21u);
   EXPECT_EQ(platform_test::rawLines(capture),
             std::vector<std::string>{kLogPrefix + "Instrumentation source \"" + text +
@@ -160,17 +237,35 @@ TEST_F(IpmiSimulatorTest, ABmcThatNeverAnsweredIsDegradedWithinTheTimeout) {
                                      "300 ms"});
 }
 
+TEST_F(IpmiSimulatorTest, TheNetworkTransportMeasuresTheDeadlineByItsOwnClock) {
+  IpmiSimulator bmc;
+  Kesta::platform::IpmiLanTarget target;
+  target.host = "127.0.0.1";
+  target.port = bmc.port();
+  target.credentials = Kesta::platform::readIpmiCredentials(bmc.readerCredentials());
+  const auto clock = std::make_shared<ManualClock>();
+  const Kesta::platform::IpmiLanTransport transport(std::move(target), clock);
+  const IpmiRequest getChassisStatus{0x00, 0x01, {}};
+  // The deadline has come by the transport's clock. A transport that read the steady clock
+  // instead would see hours left (unless the machine has been up for 1000 hours).
+  const IpmiResponse late = transport.transact(getChassisStatus, clock->now());
+  EXPECT_FALSE(late.answered);
+  EXPECT_TRUE(late.timedOut);
+  EXPECT_EQ(late.failure, "no time was left to ask the BMC");
+  const IpmiResponse inTime = transport.transact(getChassisStatus, clock->now() + 1s);
+  EXPECT_TRUE(inTime.answered) << inTime.failure;
+}
+
 TEST_F(IpmiSimulatorTest, AWrongPasswordIsDegradedAndNeverLogged) {
   IpmiSimulator bmc;
   testsupport::TempDir dir;
   ipmi_test::writePrivateFile(dir.file("bmc.conf"), "user = reader\npassword = wr0ng-pa55word\n");
   const std::string text =
       "ipmi-lan:127.0.0.1:" + std::to_string(bmc.port()) + "?credentials=" + dir.file("bmc.conf");
-  ScopedEnv source("KESTA_INSTRUMENTATION", text);
+  const auto handed = std::make_shared<Handed>();
   LogCapture capture;
-  const Clock::time_point start = Clock::now();
-  const Light light = readLight();
-  EXPECT_LT(Clock::now() - start, 1200ms);
+  const Light light = readLight(recordedSource(text, handed));
+  EXPECT_EQ(handed->timeouts, std::vector<IpmiClock::duration>{1000ms}) << "the default timeout";
   EXPECT_EQ(light.status, 21u);
   const std::vector<std::string> lines = platform_test::rawLines(capture);
   ASSERT_EQ(lines.size(), 1u);
@@ -228,7 +323,8 @@ TEST_F(IpmiSimulatorTest, SeveralOperationsReadAtOnce) {
 }
 
 // One read as an operation makes it: the source text, the credentials file, the cursor, one
-// Get Chassis Status over the open session. The median of 1,000 is reported.
+// Get Chassis Status over the open session. The median of 1,000 is reported, not judged: how
+// long a read takes depends on the machine and on what else it does at the moment.
 TEST_F(IpmiSimulatorTest, MedianTimeOfOneRead) {
   IpmiSimulator bmc;
   ScopedEnv source("KESTA_INSTRUMENTATION", bmc.sourceText());
@@ -246,7 +342,6 @@ TEST_F(IpmiSimulatorTest, MedianTimeOfOneRead) {
   const double median = ipmi_test::medianMicroseconds(samples);
   std::cout << "median time of one read over loopback (1000 reads): " << median << " us\n";
   RecordProperty("median_read_microseconds", std::to_string(median));
-  EXPECT_LT(median, 100000.0);
 }
 
 }  // namespace

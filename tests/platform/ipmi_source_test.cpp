@@ -1,9 +1,13 @@
 // The IPMI source over a stand-in transport: the one node it yields for every kind of answer,
-// the one log line for every failure, its time bound, and reading it from several threads.
+// the one log line for every failure, its time bound, and reading it from several threads. Time
+// is a ManualClock that moves only when a stand-in waits, so the bound is checked exactly.
 #include <gtest/gtest.h>
+#include <linux/ipmi.h>
+#include <sys/ioctl.h>
 #include <sys/stat.h>
 
 #include <atomic>
+#include <cerrno>
 #include <chrono>
 #include <memory>
 #include <mutex>
@@ -11,7 +15,9 @@
 #include <thread>
 #include <vector>
 
+#include "FakeFileSystem.h"
 #include "KestaInstrumentation.h"
+#include "ManualClock.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/InstrumentationSource.h"
 #include "instrumentation/ipmi/IpmiSource.h"
@@ -23,13 +29,18 @@ using Kesta::Instrumentation;
 using Kesta::NodeLexicon;
 using Kesta::platform::InstrumentationNode;
 using Kesta::platform::IpmiClock;
+using Kesta::platform::IpmiDeviceOs;
 using Kesta::platform::IpmiRequest;
 using Kesta::platform::IpmiResponse;
 using Kesta::platform::IpmiSource;
 using Kesta::platform::IpmiSourceOptions;
+using Kesta::platform::IpmiSourceSystem;
 using Kesta::platform::IpmiTransport;
+using Kesta::platform::makeIpmiSource;
 using Kesta::platform::OnReport;
 using Kesta::platform::SourceError;
+using platform_test::FakeFileSystem;
+using platform_test::ManualClock;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
 using testsupport::TempDir;
@@ -45,6 +56,8 @@ struct Exchange {
   std::vector<IpmiClock::time_point> deadlines;
   IpmiResponse response;
   bool waitForDeadline = false;  // act as a BMC that never answers
+  std::shared_ptr<ManualClock> clock = std::make_shared<ManualClock>();
+  std::vector<IpmiClock::time_point> calledAt;  // the clock when transact was called
 };
 
 class FakeTransport final : public IpmiTransport {
@@ -58,11 +71,12 @@ class FakeTransport final : public IpmiTransport {
       std::lock_guard<std::mutex> lock(exchange_->mutex);
       exchange_->requests.push_back(request);
       exchange_->deadlines.push_back(deadline);
+      exchange_->calledAt.push_back(exchange_->clock->now());
       wait = exchange_->waitForDeadline;
       response = exchange_->response;
     }
     if (wait) {
-      std::this_thread::sleep_until(deadline);
+      exchange_->clock->advanceTo(deadline);  // waits until the deadline, as a transport does
       return IpmiResponse::timeout("no answer from the BMC");
     }
     return response;
@@ -77,7 +91,8 @@ class IpmiSourceTest : public ::testing::Test {
   std::unique_ptr<IpmiSource> source(IpmiSourceOptions options = {}) {
     return std::make_unique<IpmiSource>(
         "ipmi:/dev/ipmi0", "ipmi:/dev/ipmi0", std::move(options),
-        [exchange = exchange_] { return std::make_unique<FakeTransport>(exchange); });
+        [exchange = exchange_] { return std::make_unique<FakeTransport>(exchange); },
+        exchange_->clock);
   }
 
   InstrumentationNode readOne(IpmiSourceOptions options = {}) {
@@ -184,12 +199,31 @@ TEST_F(IpmiSourceTest, TheDeadlineIsTheTimeoutFromNow) {
   answer({0x00, 0x01, 0x00, 0x40});
   IpmiSourceOptions options;
   options.timeout = 2500ms;
-  const IpmiClock::time_point before = IpmiClock::now();
+  const IpmiClock::time_point before = exchange_->clock->now();
   readOne(options);
-  const IpmiClock::time_point after = IpmiClock::now();
+  const IpmiClock::time_point after = exchange_->clock->now();
   ASSERT_EQ(exchange_->deadlines.size(), 1u);
   EXPECT_GE(exchange_->deadlines[0], before + 2500ms);
   EXPECT_LE(exchange_->deadlines[0], after + 2500ms);
+  EXPECT_EQ(exchange_->deadlines[0], ManualClock::kStart + 2500ms);
+}
+
+TEST_F(IpmiSourceTest, MakingTheTransportCountsAgainstTheTimeout) {
+  // Reading the credentials and loading the network transport take time of the same read.
+  answer({0x00, 0x01, 0x00, 0x40});
+  IpmiSourceOptions options;
+  options.timeout = 300ms;
+  const IpmiSource slowToMake(
+      "ipmi-lan:bmc?credentials=/c", "ipmi-lan:bmc:623", options,
+      [exchange = exchange_] {
+        exchange->clock->advance(40ms);
+        return std::make_unique<FakeTransport>(exchange);
+      },
+      exchange_->clock);
+  slowToMake.readNodes();
+  ASSERT_EQ(exchange_->deadlines.size(), 1u);
+  EXPECT_EQ(exchange_->deadlines[0], ManualClock::kStart + 300ms);
+  EXPECT_EQ(exchange_->deadlines[0] - exchange_->calledAt[0], 260ms);
 }
 
 TEST_F(IpmiSourceTest, ABmcThatNeverAnswersHoldsAReadNoLongerThanTheTimeout) {
@@ -197,11 +231,12 @@ TEST_F(IpmiSourceTest, ABmcThatNeverAnswersHoldsAReadNoLongerThanTheTimeout) {
   exchange_->waitForDeadline = true;
   IpmiSourceOptions options;
   options.timeout = 150ms;
-  const auto start = std::chrono::steady_clock::now();
   const InstrumentationNode node = readOne(options);
-  const auto took = std::chrono::steady_clock::now() - start;
   EXPECT_EQ(node.status, 21u);
-  EXPECT_LT(took, 400ms);
+  // The source handed the transport the whole timeout, and the read ended at the deadline.
+  ASSERT_EQ(exchange_->deadlines.size(), 1u);
+  EXPECT_EQ(exchange_->deadlines[0] - exchange_->calledAt[0], 150ms);
+  EXPECT_EQ(exchange_->clock->elapsed(), 150ms);
   EXPECT_EQ(platform_test::rawLines(capture),
             std::vector<std::string>{kLogPrefix +
                                      "Instrumentation source \"ipmi:/dev/ipmi0\" cannot read the "
@@ -250,6 +285,71 @@ TEST_F(IpmiSourceTest, SeveralThreadsReadAtOnce) {
   }
   EXPECT_EQ(wrong.load(), 0);
   EXPECT_EQ(exchange_->requests.size(), 1600u);
+}
+
+// A device that takes every request and never answers; its poll() waits by moving the clock.
+class SilentDevice final : public IpmiDeviceOs {
+ public:
+  explicit SilentDevice(std::shared_ptr<ManualClock> clock) : clock_(std::move(clock)) {}
+
+  int open(const char*, int) override { return 7; }
+  int close(int) override { return 0; }
+  int ioctl(int, unsigned long request, void*) override {
+    return request == IPMICTL_SEND_COMMAND ? 0 : -EAGAIN;
+  }
+  int poll(struct pollfd*, nfds_t, int timeoutMilliseconds) override {
+    std::lock_guard<std::mutex> lock(mutex_);
+    polls.push_back(timeoutMilliseconds);
+    clock_->advance(std::chrono::milliseconds(timeoutMilliseconds));
+    return 0;
+  }
+
+  std::vector<int> polls;
+
+ private:
+  std::shared_ptr<ManualClock> clock_;
+  std::mutex mutex_;
+};
+
+// The factory with every seam: source text, source, in-band transport, the device's system
+// calls and the clock.
+TEST(IpmiSourceSystemTest, AnInBandReadThatGetsNoAnswerEndsExactlyAtTheTimeout) {
+  LogCapture capture;
+  IpmiSourceSystem system;
+  const auto clock = std::make_shared<ManualClock>();
+  const auto device = std::make_shared<SilentDevice>(clock);
+  system.clock = clock;
+  system.device = device;
+  const auto source = makeIpmiSource("ipmi:/dev/ipmi1?timeout=150ms", system);
+  const std::vector<InstrumentationNode> nodes = source->readNodes();
+  ASSERT_EQ(nodes.size(), 1u);
+  EXPECT_EQ(nodes[0].status, 21u);
+  EXPECT_EQ(device->polls, std::vector<int>{150});
+  EXPECT_EQ(clock->elapsed(), 150ms);
+  EXPECT_EQ(platform_test::rawLines(capture),
+            std::vector<std::string>{kLogPrefix +
+                                     "Instrumentation source \"ipmi:/dev/ipmi1?timeout=150ms\" "
+                                     "cannot read the identify light: no answer from the BMC "
+                                     "within 150 ms"});
+}
+
+TEST(IpmiSourceSystemTest, TheCredentialsAreReadThroughTheGivenFileSystem) {
+  IpmiSourceSystem system;
+  const auto files = std::make_shared<FakeFileSystem>();
+  files->addFile("/etc/kesta/bmc.conf", "user = monitor\npassword = n0t-in-the-log\n", 0640);
+  system.files = files;
+  const auto source = makeIpmiSource("ipmi-lan:bmc?credentials=/etc/kesta/bmc.conf", system);
+  try {
+    source->readNodes();
+    ADD_FAILURE() << "no exception";
+  } catch (const SourceError& error) {
+    EXPECT_EQ(std::string(error.what()),
+              "credentials file \"/etc/kesta/bmc.conf\" has mode 0640, which lets others read or "
+              "change it; allow its owner only (chmod 600)");
+  }
+  EXPECT_EQ(files->count(FakeFileSystem::Call::Open, "/etc/kesta/bmc.conf"), 1u);
+  EXPECT_EQ(files->count(FakeFileSystem::Call::Read, "/etc/kesta/bmc.conf"), 0u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
 }
 
 // The real factory and the real in-band transport, on a device that does not exist.

@@ -3,9 +3,11 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <cstdint>
 #include <iostream>
+#include <memory>
 #include <nlohmann/json.hpp>
 #include <optional>
 #include <random>
@@ -13,6 +15,7 @@
 #include <string>
 #include <vector>
 
+#include "FakeFileSystem.h"
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/json/JsonFileSource.h"
@@ -24,8 +27,10 @@ namespace {
 using Kesta::Instrumentation;
 using Kesta::NodeLexicon;
 using Kesta::platform::InstrumentationNode;
+using Kesta::platform::JsonFileSource;
 using Kesta::platform::parseNodeSnapshot;
 using Kesta::platform::SourceError;
+using platform_test::FakeFileSystem;
 using platform_test::writeFileIn;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
@@ -34,19 +39,6 @@ using testsupport::TempDir;
 constexpr auto kBlueLight = NodeLexicon::NODE_TYPE_BLUE_LIGHT;
 constexpr auto kAlarmState = NodeLexicon::PROPERTY_ALARM_STATE;
 const std::string kFixtures = PLATFORM_TEST_FIXTURES;
-
-#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool kInstrumentedBuild = true;
-#elif defined(__has_feature)
-#if __has_feature(address_sanitizer) || __has_feature(thread_sanitizer) || \
-    __has_feature(memory_sanitizer)
-constexpr bool kInstrumentedBuild = true;
-#else
-constexpr bool kInstrumentedBuild = false;
-#endif
-#else
-constexpr bool kInstrumentedBuild = false;
-#endif
 
 // The same snapshot read the slow, obvious way through nlohmann's document model: an oracle for
 // the streaming reader on valid input.
@@ -331,16 +323,60 @@ TEST(JsonSource, FifoInsteadOfFileIsLoggedAndThrownWithoutBlocking) {
   EXPECT_EQ(expectUnreadable(path), prefixFor(path) + "it is not a regular file");
 }
 
+// What a cursor over `source` reports: the exception text, after checking that the same text is
+// the one log line.
+std::string expectUnreadableSource(std::unique_ptr<JsonFileSource> source) {
+  LogCapture capture;
+  std::string what = "(no exception)";
+  try {
+    Instrumentation cursor(std::move(source));
+  } catch (const std::exception& error) {
+    what = error.what();
+  }
+  EXPECT_EQ(platform_test::rawLines(capture),
+            std::vector<std::string>{"Kesta.Platform.Instrumentation\t6000\tLOG\t" + what});
+  return what;
+}
+
 TEST(JsonSource, UnreadableFileIsLoggedAndThrown) {
   TempDir dir;
   const std::string path = dir.file("secret.json");
   writeFileIn(path, "{\"nodes\": []}");
   ASSERT_EQ(::chmod(path.c_str(), 0), 0);
-  if (::access(path.c_str(), R_OK) == 0) {
-    GTEST_SKIP() << "running with privileges that read any file; the directory, FIFO and "
-                    "missing-file cases cover unreadable sources";
-  }
-  EXPECT_EQ(expectUnreadable(path), prefixFor(path) + "Permission denied");
+  // The kernel refuses a file of mode 0 to everyone but root; the refusal is injected, so that
+  // the test means the same whoever runs it.
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(FakeFileSystem::Call::Open, path, EACCES);
+  EXPECT_EQ(expectUnreadableSource(std::make_unique<JsonFileSource>(path, files)),
+            "Instrumentation source \"file:" + path + "\" cannot be read: Permission denied");
+  EXPECT_EQ(files->count(FakeFileSystem::Call::Open, path), 1u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST(JsonSource, AFileThatFailsWhileBeingReadIsLoggedAndThrown) {
+  TempDir dir;
+  const std::string path = dir.file("tree.json");
+  writeFileIn(path, "{\"nodes\": []}");
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(FakeFileSystem::Call::Read, path, EIO);
+  EXPECT_EQ(expectUnreadableSource(std::make_unique<JsonFileSource>(path, files)),
+            "Instrumentation source \"file:" + path + "\" cannot be read: Input/output error");
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST(JsonSource, ASnapshotIsReadThroughTheGivenFileSystem) {
+  const auto files = std::make_shared<FakeFileSystem>();
+  files->addFile("/var/lib/kesta/tree.json",
+                 "{\"nodes\": [{\"type\": 26, \"path\": \"1.2\", \"description\": \"Blue "
+                 "Light\"}]}");
+  const JsonFileSource source("/var/lib/kesta/tree.json", files);
+  EXPECT_EQ(source.name(), "file:/var/lib/kesta/tree.json");
+  const std::vector<InstrumentationNode> nodes = source.readNodes();
+  ASSERT_EQ(nodes.size(), 1u);
+  EXPECT_EQ(nodes[0].path, "1.2");
+  // Afresh on every read.
+  files->addFile("/var/lib/kesta/tree.json", "{\"nodes\": []}");
+  EXPECT_TRUE(source.readNodes().empty());
 }
 
 TEST(JsonSource, MalformedFixtureIsLoggedAndThrown) {
@@ -646,12 +682,10 @@ TEST(JsonSource, LargeTrees) {
     std::cout << "[ timing ] " << count << " nodes (" << text.size() / 1024
               << " KiB): cursor opened in " << cursorMs << " ms (best of 5); document-model "
               << "parse of the same text " << documentMs << " ms\n";
+    // Reported, not judged: a loaded machine or a sanitizer makes any bound on wall time fail
+    // for reasons of its own. The benchmarks (scripts/bench.sh) hold an operation, the reading
+    // of the tree included, to its targets.
     RecordProperty("nodes_" + std::to_string(count) + "_cursor_ms", std::to_string(cursorMs));
-    // Generous: this runs on every CIM operation and takes some tens of milliseconds. Sanitizer
-    // builds run many times slower, so only the plain build is held to it.
-    if (!kInstrumentedBuild) {
-      EXPECT_LT(cursorMs, 1000.0);
-    }
   }
 }
 

@@ -4,11 +4,14 @@
 
 #include <algorithm>
 #include <atomic>
+#include <cerrno>
 #include <filesystem>
+#include <memory>
 #include <string>
 #include <thread>
 #include <vector>
 
+#include "FakeFileSystem.h"
 #include "KestaLocale.h"
 #include "PlatformTestSupport.h"
 #include "locale/Catalogues.h"
@@ -20,6 +23,8 @@ using Kesta::make_string;
 using Kesta::ResourceString;
 using Kesta::Locale::getLanguageId;
 using Kesta::Locale::getResourceLibrary;
+using Kesta::platform::CatalogueCache;
+using platform_test::FakeFileSystem;
 using platform_test::writeFileIn;
 using testsupport::ScopedEnv;
 using testsupport::TempDir;
@@ -215,6 +220,48 @@ TEST(Locale, SearchedFoldersForBuildAndInstalledLayouts) {
 
   const auto nothing = Kesta::platform::catalogueDirectories("");
   EXPECT_EQ(nothing, (std::vector<std::string>{PLATFORM_TEST_INSTALL_LOCALEDIR}));
+}
+
+// The caption of a catalogue the cache gave, or "(none)".
+std::string captionIn(const std::shared_ptr<const Kesta::platform::MoCatalogue>& catalogue) {
+  if (catalogue == nullptr) {
+    return "(none)";
+  }
+  const std::string* text = catalogue->find("MSGID_ALARMDEVICE_CAPTION");
+  return text != nullptr ? *text : "(no caption)";
+}
+
+TEST(CatalogueCache, AnUnchangedCatalogueCostsOneStat) {
+  const auto files = std::make_shared<FakeFileSystem>();
+  files->addFile("/share/locale/de.mo", testsupport::readFile(builtCatalogue("de")));
+  CatalogueCache cache(files);
+  EXPECT_EQ(captionIn(cache.get("/share/locale/de.mo")), "Blaue Leuchte");
+  EXPECT_EQ(captionIn(cache.get("/share/locale/de.mo")), "Blaue Leuchte");
+  EXPECT_EQ(files->count(FakeFileSystem::Call::StatAt, "/share/locale/de.mo"), 2u);
+  EXPECT_EQ(files->count(FakeFileSystem::Call::Open, "/share/locale/de.mo"), 1u);
+  // Rewritten: read again.
+  files->addFile("/share/locale/de.mo", testsupport::readFile(builtCatalogue("fr")));
+  EXPECT_EQ(captionIn(cache.get("/share/locale/de.mo")), "Voyant bleu");
+  EXPECT_EQ(files->count(FakeFileSystem::Call::Open, "/share/locale/de.mo"), 2u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST(CatalogueCache, ACatalogueThatCannotBeReadIsNone) {
+  const auto files = std::make_shared<FakeFileSystem>();
+  files->addFile("/l/locked.mo", testsupport::readFile(builtCatalogue("de")));
+  files->addFile("/l/failing.mo", testsupport::readFile(builtCatalogue("de")));
+  files->fail(FakeFileSystem::Call::Open, "/l/locked.mo", EACCES);
+  files->fail(FakeFileSystem::Call::Read, "/l/failing.mo", EIO, 1);
+  files->fail(FakeFileSystem::Call::StatAt, "/l/hidden.mo", EACCES);
+  CatalogueCache cache(files);
+  EXPECT_EQ(captionIn(cache.get("/l/locked.mo")), "(none)");
+  EXPECT_EQ(captionIn(cache.get("/l/failing.mo")), "(none)");
+  EXPECT_EQ(captionIn(cache.get("/l/hidden.mo")), "(none)");
+  EXPECT_EQ(captionIn(cache.get("/l")), "(none)");
+  // Once the file changes it is read again.
+  files->addFile("/l/failing.mo", testsupport::readFile(builtCatalogue("fr")));
+  EXPECT_EQ(captionIn(cache.get("/l/failing.mo")), "Voyant bleu");
+  EXPECT_EQ(files->openDescriptors(), 0u);
 }
 
 TEST(Locale, ConcurrentLookups) {

@@ -1,9 +1,11 @@
 // Which source a cursor opens: KESTA_INSTRUMENTATION, else the configuration file, else sysfs.
 #include <gtest/gtest.h>
 
+#include <cerrno>
 #include <string>
 #include <vector>
 
+#include "FakeFileSystem.h"
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/InstrumentationSource.h"
@@ -16,6 +18,7 @@ using Kesta::platform::configuredSource;
 using Kesta::platform::makeInstrumentationSource;
 using Kesta::platform::setConfigurationFileForTesting;
 using Kesta::platform::SourceError;
+using platform_test::FakeFileSystem;
 using platform_test::writeFileIn;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
@@ -131,6 +134,37 @@ TEST_F(SourceSelection, UnreadableConfigurationFileIsLoggedAndThrown) {
   std::filesystem::create_directories(configFile());
   EXPECT_EQ(failureText(), "Instrumentation configuration cannot be used: configuration file \"" +
                                configFile() + "\" cannot be read: it is a directory");
+}
+
+TEST_F(SourceSelection, AConfigurationFileThatCannotBeOpenedOrReadIsThrown) {
+  ScopedEnv source("KESTA_INSTRUMENTATION", std::nullopt);
+  writeFileIn(configFile(), "sysfs:/sys/class/leds\n");
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(FakeFileSystem::Call::Open, configFile(), EACCES, 1);
+  files->fail(FakeFileSystem::Call::Read, configFile(), EIO, 1);
+  for (const std::string reason : {"Permission denied", "Input/output error"}) {
+    try {
+      configuredSource(*files);
+      ADD_FAILURE() << "no exception for " << reason;
+    } catch (const SourceError& error) {
+      EXPECT_EQ(std::string(error.what()),
+                "configuration file \"" + configFile() + "\" cannot be read: " + reason);
+    }
+  }
+  const Kesta::platform::SourceSetting setting = configuredSource(*files);
+  EXPECT_EQ(setting.text, "sysfs:/sys/class/leds");
+  EXPECT_EQ(setting.origin, configFile());
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST_F(SourceSelection, AConfigurationFileThatIsNotThereMeansTheDefault) {
+  ScopedEnv source("KESTA_INSTRUMENTATION", std::nullopt);
+  FakeFileSystem files;
+  EXPECT_EQ(configuredSource(files).origin, "default");
+  files.addFile(configFile(), "file:/tree.json\n");
+  EXPECT_EQ(configuredSource(files).text, "file:/tree.json");
+  files.fail(FakeFileSystem::Call::Open, configFile(), ENOENT);
+  EXPECT_EQ(configuredSource(files).text, "sysfs:/sys/class/leds");
 }
 
 TEST_F(SourceSelection, BlankFirstLineIsLoggedAndThrown) {

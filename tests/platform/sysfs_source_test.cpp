@@ -1,11 +1,14 @@
 // The "sysfs:" source on fake LED class trees built in temporary folders.
 #include <gtest/gtest.h>
-#include <unistd.h>
+#include <sys/stat.h>
 
+#include <cerrno>
+#include <memory>
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "FakeFileSystem.h"
 #include "KestaInstrumentation.h"
 #include "PlatformTestSupport.h"
 #include "instrumentation/leds/SysfsLedSource.h"
@@ -17,8 +20,10 @@ using Kesta::NodeLexicon;
 using Kesta::platform::InstrumentationNode;
 using Kesta::platform::isBlueLight;
 using Kesta::platform::ledAlarmState;
+using Kesta::platform::SourceError;
 using Kesta::platform::splitLedName;
 using Kesta::platform::SysfsLedSource;
+using platform_test::FakeFileSystem;
 using platform_test::writeFileIn;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
@@ -26,6 +31,7 @@ using testsupport::TempDir;
 
 constexpr auto kBlueLight = NodeLexicon::NODE_TYPE_BLUE_LIGHT;
 constexpr auto kAlarmState = NodeLexicon::PROPERTY_ALARM_STATE;
+using Call = FakeFileSystem::Call;
 
 // One LED folder; a missing optional leaves the file out.
 void addLed(const TempDir& tree, const std::string& name, std::optional<std::string> trigger,
@@ -144,13 +150,84 @@ TEST(SysfsSource, AnUnreadableLedIsListedWithoutState) {
 TEST(SysfsSource, AnUnreadableBrightnessFileWithoutPermission) {
   TempDir tree;
   addLed(tree, "x:blue:y", "[none]", "1");
-  ASSERT_EQ(::chmod((tree.file("x:blue:y/brightness")).c_str(), 0), 0);
-  if (::access((tree.file("x:blue:y/brightness")).c_str(), R_OK) == 0) {
-    GTEST_SKIP() << "running with privileges that read any file";
-  }
-  const auto nodes = SysfsLedSource(tree.path()).readNodes();
+  const std::string brightness = tree.file("x:blue:y/brightness");
+  ASSERT_EQ(::chmod(brightness.c_str(), 0), 0);
+  // The kernel refuses a file of mode 0 to everyone but root; the refusal is injected, so that
+  // the test means the same whoever runs it.
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(Call::Open, brightness, EACCES);
+  const auto nodes = SysfsLedSource(tree.path(), files).readNodes();
   ASSERT_EQ(nodes.size(), 1u);
   EXPECT_EQ(nodes[0].status, 0u);
+  EXPECT_EQ(files->count(Call::Open, brightness), 1u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST(SysfsSource, ATriggerFileThatFailsWhileBeingReadLeavesTheStateUnknown) {
+  TempDir tree;
+  addLed(tree, "a:blue:broken", "[timer]", "1");
+  addLed(tree, "b:blue:fine", "[timer]", "1");
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(Call::Read, tree.file("a:blue:broken/trigger"), EIO);
+  const auto nodes = SysfsLedSource(tree.path(), files).readNodes();
+  ASSERT_EQ(nodes.size(), 2u);
+  EXPECT_EQ(nodes[0].status, 0u);
+  EXPECT_TRUE(nodes[0].properties.empty());
+  EXPECT_EQ(nodes[1].property(kAlarmState), 3u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+TEST(SysfsSource, AnLedThatGoesAfterTheListingIsLeftOut) {
+  TempDir tree;
+  addLed(tree, "a:blue:unplugged", "[none]", "1");
+  addLed(tree, "b:blue:here", "[none]", "1");
+  const auto files = FakeFileSystem::overRealFiles();
+  files->fail(Call::StatAt, tree.file("a:blue:unplugged"), ENOENT);
+  const auto nodes = SysfsLedSource(tree.path(), files).readNodes();
+  ASSERT_EQ(nodes.size(), 1u);
+  EXPECT_EQ(nodes[0].path, "b:blue:here");
+}
+
+TEST(SysfsSource, AClassFolderThatCannotBeOpenedOrListedIsThrown) {
+  const auto files = std::make_shared<FakeFileSystem>();
+  files->addDirectory("/sys/class/leds");
+  files->fail(Call::OpenDirectory, "/sys/class/leds", EACCES, 1);
+  files->fail(Call::List, "/sys/class/leds", EIO, 1);
+  const SysfsLedSource source("/sys/class/leds", files);
+  for (const std::string expected : {"Permission denied", "Input/output error"}) {
+    try {
+      source.readNodes();
+      ADD_FAILURE() << "no exception for " << expected;
+    } catch (const SourceError& error) {
+      EXPECT_EQ(std::string(error.what()), expected);
+    }
+  }
+  EXPECT_TRUE(source.readNodes().empty());
+  EXPECT_EQ(files->openDescriptors(), 0u);
+}
+
+// The layout of the kernel's class folder: links into the device tree, one of them dangling,
+// attributes that report a size of 4096 whatever they hold.
+TEST(SysfsSource, AnInMemoryClassFolderLikeTheKernels) {
+  const auto files = std::make_shared<FakeFileSystem>();
+  const std::string device = "/sys/devices/platform/leds/leds/";
+  files->addFile(device + "server:blue:uid/trigger", "none timer [heartbeat]\n");
+  files->addFile(device + "server:blue:uid/brightness", "0\n");
+  files->addFile(device + "chassis::locate/brightness", "255\n");
+  files->addFile(device + "input3::capslock/brightness", "1\n");
+  for (const std::string led : {"server:blue:uid", "chassis::locate", "input3::capslock"}) {
+    files->addSymlink("/sys/class/leds/" + led, "../../devices/platform/leds/leds/" + led);
+    files->changeStatus(device + led + "/brightness",
+                        [](struct stat& info) { info.st_size = 4096; });
+  }
+  files->addSymlink("/sys/class/leds/gone:blue:uid", "../../devices/platform/gone");
+  const auto nodes = SysfsLedSource("/sys/class/leds", files).readNodes();
+  ASSERT_EQ(nodes.size(), 2u);
+  EXPECT_EQ(nodes[0].path, "chassis::locate");
+  EXPECT_EQ(nodes[0].property(kAlarmState), 2u);
+  EXPECT_EQ(nodes[1].path, "server:blue:uid");
+  EXPECT_EQ(nodes[1].property(kAlarmState), 3u);
+  EXPECT_EQ(files->openDescriptors(), 0u);
 }
 
 TEST(SysfsSource, AnEmptyClassFolderHasNoLights) {

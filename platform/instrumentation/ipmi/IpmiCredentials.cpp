@@ -1,6 +1,5 @@
 #include "instrumentation/ipmi/IpmiCredentials.h"
 
-#include <fcntl.h>
 #include <string.h>
 #include <unistd.h>
 
@@ -9,8 +8,8 @@
 #include <cerrno>
 #include <cstdio>
 
-#include "os/FileIo.h"
 #include "instrumentation/SourceError.h"
+#include "os/FileIo.h"
 #include "text/Text.h"
 
 namespace Kesta {
@@ -185,17 +184,18 @@ std::string credentialsFileProblem(const struct stat& info, uid_t user) {
   return std::string();
 }
 
-IpmiCredentials readIpmiCredentials(const std::string& file) {
+IpmiCredentials readIpmiCredentials(const std::string& file, FileSystem& files) {
   if (file.empty() || file.front() != '/') {
     refuse(file, "is not an absolute path");
   }
-  UniqueFd fd(::open(file.c_str(), O_RDONLY | O_CLOEXEC | O_NOCTTY | O_NONBLOCK));
-  if (!fd) {
-    refuse(file, "cannot be opened: " + errorText(errno));
+  const int opened = files.openForReading(kWorkingDirectory, file);
+  if (opened < 0) {
+    refuse(file, "cannot be opened: " + errorText(-opened));
   }
+  const FileSystemFd fd(files, opened);
   struct stat info = {};
-  if (::fstat(fd.get(), &info) != 0) {
-    refuse(file, "cannot be examined: " + errorText(errno));
+  if (const int examined = files.fstat(fd.get(), info); examined < 0) {
+    refuse(file, "cannot be examined: " + errorText(-examined));
   }
   if (std::string problem = credentialsFileProblem(info, ::geteuid()); !problem.empty()) {
     refuse(file, problem);
@@ -204,12 +204,12 @@ IpmiCredentials readIpmiCredentials(const std::string& file) {
   WipedBuffer<kCredentialsFileLimit + 1> buffer;
   std::size_t used = 0;
   while (used < buffer.bytes.size()) {
-    const ssize_t got = ::read(fd.get(), buffer.bytes.data() + used, buffer.bytes.size() - used);
+    const long got = files.read(fd.get(), buffer.bytes.data() + used, buffer.bytes.size() - used);
     if (got < 0) {
-      if (errno == EINTR) {
+      if (got == -EINTR) {
         continue;
       }
-      refuse(file, "cannot be read: " + errorText(errno));
+      refuse(file, "cannot be read: " + errorText(static_cast<int>(-got)));
     }
     if (got == 0) {
       break;
@@ -220,6 +220,10 @@ IpmiCredentials readIpmiCredentials(const std::string& file) {
     refuse(file, "is larger than " + std::to_string(kCredentialsFileLimit) + " bytes");
   }
   return parseIpmiCredentials(std::string_view(buffer.bytes.data(), used), file);
+}
+
+IpmiCredentials readIpmiCredentials(const std::string& file) {
+  return readIpmiCredentials(file, *systemFileSystem());
 }
 
 }  // namespace platform

@@ -17,6 +17,8 @@
 #include <string>
 #include <string_view>
 
+#include "os/FileSystem.h"
+
 namespace Kesta {
 namespace platform {
 
@@ -59,9 +61,11 @@ IpmiCredentials parseIpmiCredentials(std::string_view text, const std::string& f
 // and others no permission at all.
 std::string credentialsFileProblem(const struct stat& info, uid_t user);
 
-// Reads and parses the credentials file at `file` after checking it with
+// Reads and parses the credentials file at `file` through `files` after checking it with
 // credentialsFileProblem (for the process's effective user), before a byte of it is read.
 // Throws SourceError.
+IpmiCredentials readIpmiCredentials(const std::string& file, FileSystem& files);
+// The same through the real file system.
 IpmiCredentials readIpmiCredentials(const std::string& file);
 
 }  // namespace platform

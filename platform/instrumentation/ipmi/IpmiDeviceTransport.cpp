@@ -60,8 +60,8 @@ std::atomic<long> nextMessageId{1};
 // Room for the largest answer the driver delivers; anything longer is cut by the TRUNC ioctl.
 constexpr std::size_t kAnswerBuffer = 272;
 
-int millisecondsUntil(IpmiClock::time_point deadline) {
-  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - IpmiClock::now());
+int millisecondsUntil(const Clock& clock, IpmiClock::time_point deadline) {
+  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - clock.now());
   return left.count() <= 0 ? 0 : static_cast<int>(left.count());
 }
 
@@ -74,8 +74,9 @@ std::shared_ptr<IpmiDeviceOs> systemIpmiDeviceOs() {
   return os;
 }
 
-IpmiDeviceTransport::IpmiDeviceTransport(std::string device, std::shared_ptr<IpmiDeviceOs> os)
-    : device_(std::move(device)), os_(std::move(os)) {}
+IpmiDeviceTransport::IpmiDeviceTransport(std::string device, std::shared_ptr<IpmiDeviceOs> os,
+                                         std::shared_ptr<const Clock> clock)
+    : device_(std::move(device)), os_(std::move(os)), clock_(std::move(clock)) {}
 
 IpmiResponse IpmiDeviceTransport::transact(const IpmiRequest& request,
                                            IpmiClock::time_point deadline) const {
@@ -116,7 +117,7 @@ IpmiResponse IpmiDeviceTransport::transact(const IpmiRequest& request,
   }
 
   for (;;) {
-    const int wait = millisecondsUntil(deadline);
+    const int wait = millisecondsUntil(*clock_, deadline);
     if (wait == 0) {
       return IpmiResponse::timeout("no answer from the BMC");
     }

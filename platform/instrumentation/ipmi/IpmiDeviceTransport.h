@@ -9,6 +9,7 @@
 #include <string>
 
 #include "instrumentation/ipmi/IpmiTransport.h"
+#include "os/Clock.h"
 
 namespace Kesta {
 namespace platform {
@@ -36,8 +37,10 @@ std::shared_ptr<IpmiDeviceOs> systemIpmiDeviceOs();
 
 class IpmiDeviceTransport final : public IpmiTransport {
  public:
+  // The deadline is measured by `clock`; every poll() waits at most the time left by it.
   explicit IpmiDeviceTransport(std::string device,
-                               std::shared_ptr<IpmiDeviceOs> os = systemIpmiDeviceOs());
+                               std::shared_ptr<IpmiDeviceOs> os = systemIpmiDeviceOs(),
+                               std::shared_ptr<const Clock> clock = steadyClock());
 
   // Opens the device for this one request (so concurrent readers never share a descriptor or
   // see each other's answers), sends the request to the BMC over the system interface, and
@@ -48,6 +51,7 @@ class IpmiDeviceTransport final : public IpmiTransport {
  private:
   std::string device_;
   std::shared_ptr<IpmiDeviceOs> os_;
+  std::shared_ptr<const Clock> clock_;
 };
 
 }  // namespace platform

@@ -111,12 +111,12 @@ const BluelightIpmiLanApi& ipmiLanPlugin() {
                     " is not installed (looked in " + looked + ")");
 }
 
-IpmiLanTransport::IpmiLanTransport(IpmiLanTarget target)
-    : target_(std::move(target)), api_(&ipmiLanPlugin()) {}
+IpmiLanTransport::IpmiLanTransport(IpmiLanTarget target, std::shared_ptr<const Clock> clock)
+    : target_(std::move(target)), clock_(std::move(clock)), api_(&ipmiLanPlugin()) {}
 
 IpmiResponse IpmiLanTransport::transact(const IpmiRequest& request,
                                         IpmiClock::time_point deadline) const {
-  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - IpmiClock::now());
+  const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - clock_->now());
   if (left.count() <= 0) {
     return IpmiResponse::timeout("no time was left to ask the BMC");
   }

@@ -3,12 +3,14 @@
 #ifndef KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMILANTRANSPORT_H
 #define KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMILANTRANSPORT_H
 
+#include <memory>
 #include <string>
 #include <vector>
 
-#include "instrumentation/ipmi/IpmiCredentials.h"
 #include "instrumentation/ipmi-lan-plugin/IpmiLanPluginApi.h"
+#include "instrumentation/ipmi/IpmiCredentials.h"
 #include "instrumentation/ipmi/IpmiTransport.h"
+#include "os/Clock.h"
 
 namespace Kesta {
 namespace platform {
@@ -33,13 +35,16 @@ const BluelightIpmiLanApi& ipmiLanPlugin();
 
 class IpmiLanTransport final : public IpmiTransport {
  public:
-  // Loads the plug-in (throws SourceError when it cannot).
-  explicit IpmiLanTransport(IpmiLanTarget target);
+  // Loads the plug-in (throws SourceError when it cannot). The deadline is measured by `clock`.
+  explicit IpmiLanTransport(IpmiLanTarget target,
+                            std::shared_ptr<const Clock> clock = steadyClock());
 
+  // Hands the plug-in the time left until the deadline; nothing at all when none is left.
   IpmiResponse transact(const IpmiRequest& request, IpmiClock::time_point deadline) const override;
 
  private:
   IpmiLanTarget target_;
+  std::shared_ptr<const Clock> clock_;
   const BluelightIpmiLanApi* api_;
 };
 

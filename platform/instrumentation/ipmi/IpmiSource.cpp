@@ -298,45 +298,55 @@ std::string ipmiLanPath(const IpmiLanSourceSettings& settings) {
   return std::string(kLanScheme) + host + ":" + std::to_string(settings.port);
 }
 
-std::unique_ptr<InstrumentationSource> makeIpmiSource(std::string_view text) {
+IpmiSource::TransportFactory ipmiDeviceTransportFactory(const IpmiDeviceSourceSettings& settings,
+                                                        const IpmiSourceSystem& system) {
+  return [file = settings.device, device = system.device, clock = system.clock]() {
+    return std::make_unique<IpmiDeviceTransport>(file, device, clock);
+  };
+}
+
+IpmiSource::TransportFactory ipmiLanTransportFactory(const IpmiLanSourceSettings& settings,
+                                                     const IpmiSourceSystem& system) {
+  return [host = settings.host, port = settings.port, file = settings.credentialsFile,
+          files = system.files, clock = system.clock]() {
+    IpmiLanTarget target;
+    target.host = host;
+    target.port = port;
+    target.credentials = readIpmiCredentials(file, *files);
+    return std::make_unique<IpmiLanTransport>(std::move(target), clock);
+  };
+}
+
+std::unique_ptr<InstrumentationSource> makeIpmiSource(std::string_view text,
+                                                      const IpmiSourceSystem& system) {
   const std::string name(text);
   const std::string_view lan = kLanScheme;
   const std::string_view device = kDeviceScheme;
   if (text.substr(0, lan.size()) == lan) {
-    IpmiLanSourceSettings settings = parseIpmiLanSource(text.substr(lan.size()));
-    const std::string path = ipmiLanPath(settings);
-    IpmiSourceOptions options = settings.options;
-    return std::make_unique<IpmiSource>(
-        name, path, std::move(options),
-        [host = settings.host, port = settings.port, file = settings.credentialsFile]() {
-          IpmiLanTarget target;
-          target.host = host;
-          target.port = port;
-          target.credentials = readIpmiCredentials(file);
-          return std::make_unique<IpmiLanTransport>(std::move(target));
-        });
+    const IpmiLanSourceSettings settings = parseIpmiLanSource(text.substr(lan.size()));
+    return std::make_unique<IpmiSource>(name, ipmiLanPath(settings), settings.options,
+                                        ipmiLanTransportFactory(settings, system), system.clock);
   }
   if (text.substr(0, device.size()) == device) {
-    IpmiDeviceSourceSettings settings = parseIpmiDeviceSource(text.substr(device.size()));
-    const std::string path = ipmiDevicePath(settings);
-    return std::make_unique<IpmiSource>(name, path, settings.options, [file = settings.device]() {
-      return std::make_unique<IpmiDeviceTransport>(file);
-    });
+    const IpmiDeviceSourceSettings settings = parseIpmiDeviceSource(text.substr(device.size()));
+    return std::make_unique<IpmiSource>(name, ipmiDevicePath(settings), settings.options,
+                                        ipmiDeviceTransportFactory(settings, system), system.clock);
   }
   throw SourceError("not an IPMI source (expected ipmi:[<device>] or ipmi-lan:<host>)");
 }
 
 IpmiSource::IpmiSource(std::string name, std::string path, IpmiSourceOptions options,
-                       TransportFactory transport)
+                       TransportFactory transport, std::shared_ptr<const Clock> clock)
     : name_(std::move(name)),
       path_(std::move(path)),
       options_(std::move(options)),
-      transport_(std::move(transport)) {}
+      transport_(std::move(transport)),
+      clock_(std::move(clock)) {}
 
 std::vector<InstrumentationNode> IpmiSource::readNodes() const {
   // The clock starts before the transport is made, so reading the credentials and loading the
   // network transport count against the same timeout as the request.
-  const IpmiClock::time_point deadline = IpmiClock::now() + options_.timeout;
+  const IpmiClock::time_point deadline = clock_->now() + options_.timeout;
   const std::unique_ptr<IpmiTransport> transport = transport_();
   if (transport == nullptr) {
     throw SourceError("no transport to the BMC");

@@ -21,8 +21,11 @@
 #include <vector>
 
 #include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/ipmi/IpmiDeviceTransport.h"
 #include "instrumentation/ipmi/IpmiIdentify.h"
 #include "instrumentation/ipmi/IpmiTransport.h"
+#include "os/Clock.h"
+#include "os/FileSystem.h"
 
 namespace Kesta {
 namespace platform {
@@ -63,9 +66,19 @@ IpmiLanSourceSettings parseIpmiLanSource(std::string_view rest);
 std::string ipmiDevicePath(const IpmiDeviceSourceSettings& settings);
 std::string ipmiLanPath(const IpmiLanSourceSettings& settings);
 
+// What an IPMI source uses of the operating system: the clock its deadlines are measured by, the
+// file system the credentials file is read from, and the IPMI device's system calls. The real
+// ones unless a test hands in its own.
+struct IpmiSourceSystem {
+  std::shared_ptr<const Clock> clock = steadyClock();
+  std::shared_ptr<FileSystem> files = systemFileSystem();
+  std::shared_ptr<IpmiDeviceOs> device = systemIpmiDeviceOs();
+};
+
 // The source for "ipmi:..." or "ipmi-lan:..." (the whole text). Throws SourceError when the text
 // is not a valid IPMI source.
-std::unique_ptr<InstrumentationSource> makeIpmiSource(std::string_view text);
+std::unique_ptr<InstrumentationSource> makeIpmiSource(std::string_view text,
+                                                      const IpmiSourceSystem& system = {});
 
 class IpmiSource final : public InstrumentationSource {
  public:
@@ -73,8 +86,9 @@ class IpmiSource final : public InstrumentationSource {
   // network transport that is not installed).
   using TransportFactory = std::function<std::unique_ptr<IpmiTransport>()>;
 
+  // The deadline of every read is the timeout from the moment `clock` shows when it starts.
   IpmiSource(std::string name, std::string path, IpmiSourceOptions options,
-             TransportFactory transport);
+             TransportFactory transport, std::shared_ptr<const Clock> clock = steadyClock());
 
   std::string name() const override { return name_; }
 
@@ -89,7 +103,16 @@ class IpmiSource final : public InstrumentationSource {
   std::string path_;
   IpmiSourceOptions options_;
   TransportFactory transport_;
+  std::shared_ptr<const Clock> clock_;
 };
+
+// The transports makeIpmiSource gives its sources, one for every read: the device of "ipmi:",
+// or the network transport of "ipmi-lan:" with the credentials read afresh. Tests wrap them to
+// see what a source asks of its transport.
+IpmiSource::TransportFactory ipmiDeviceTransportFactory(const IpmiDeviceSourceSettings& settings,
+                                                        const IpmiSourceSystem& system);
+IpmiSource::TransportFactory ipmiLanTransportFactory(const IpmiLanSourceSettings& settings,
+                                                     const IpmiSourceSystem& system);
 
 }  // namespace platform
 }  // namespace Kesta

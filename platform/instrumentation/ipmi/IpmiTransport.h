@@ -12,6 +12,8 @@
 namespace Kesta {
 namespace platform {
 
+// The type of the deadlines. Nothing reads this clock directly: the source and the transports
+// measure deadlines by the Clock they were given (os/Clock.h), whose time points are these.
 using IpmiClock = std::chrono::steady_clock;
 
 struct IpmiRequest {

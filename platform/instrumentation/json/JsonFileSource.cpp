@@ -6,7 +6,7 @@ namespace Kesta {
 namespace platform {
 
 std::vector<InstrumentationNode> JsonFileSource::readNodes() const {
-  const ReadResult read = readRegularFile(path_, kJsonSnapshotLimit);
+  const ReadResult read = readRegularFile(*files_, path_, kJsonSnapshotLimit);
   if (!read.ok()) {
     throw SourceError(read.reason);
   }

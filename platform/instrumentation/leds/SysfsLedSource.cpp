@@ -1,13 +1,10 @@
 #include "instrumentation/leds/SysfsLedSource.h"
 
-#include <dirent.h>
-#include <fcntl.h>
 #include <sys/stat.h>
 
 #include <algorithm>
 #include <array>
 #include <cerrno>
-#include <memory>
 
 #include "KestaCommonBase.h"
 #include "KestaInstrumentation.h"
@@ -31,11 +28,6 @@ constexpr unsigned int kAlarmOff = 1;
 constexpr unsigned int kAlarmSteady = 2;
 constexpr unsigned int kAlarmAlternating = 3;
 constexpr unsigned int kStatusReadable = 1;
-
-struct DirCloser {
-  void operator()(DIR* directory) const { ::closedir(directory); }
-};
-using DirHandle = std::unique_ptr<DIR, DirCloser>;
 
 bool contains(const std::array<std::string_view, 5>& words, std::string_view word) {
   return std::find(words.begin(), words.end(), word) != words.end();
@@ -65,16 +57,17 @@ std::optional<unsigned long> parseBrightness(const std::string& text) {
 }
 
 // The state of one LED directory, or nothing when it cannot be read.
-std::optional<unsigned int> readLedState(int classFd, const std::string& led) {
+std::optional<unsigned int> readLedState(FileSystem& files, int classFd, const std::string& led) {
   std::string trigger = "none";
-  const ReadResult triggerFile = readRegularFile(classFd, led + "/trigger", kAttributeLimit);
+  const ReadResult triggerFile = readRegularFile(files, classFd, led + "/trigger", kAttributeLimit);
   if (triggerFile.ok()) {
     trigger = activeTrigger(triggerFile.data);
   } else if (triggerFile.error != ENOENT) {
     return std::nullopt;
   }
   std::optional<unsigned long> brightness;
-  const ReadResult brightnessFile = readRegularFile(classFd, led + "/brightness", kAttributeLimit);
+  const ReadResult brightnessFile =
+      readRegularFile(files, classFd, led + "/brightness", kAttributeLimit);
   if (brightnessFile.ok()) {
     brightness = parseBrightness(brightnessFile.data);
   }
@@ -137,34 +130,29 @@ std::optional<unsigned int> ledAlarmState(std::string_view trigger,
 }
 
 std::vector<InstrumentationNode> SysfsLedSource::readNodes() const {
-  const DirHandle directory(::opendir(directory_.c_str()));
-  if (directory == nullptr) {
-    throw SourceError(errorText(errno));
+  const int opened = files_->openDirectory(kWorkingDirectory, directory_);
+  if (opened < 0) {
+    throw SourceError(errorText(-opened));
   }
-  const int classFd = ::dirfd(directory.get());
+  const FileSystemFd directory(*files_, opened);
+  const int classFd = directory.get();
 
+  std::vector<std::string> names;
+  if (const int listed = files_->listDirectory(classFd, names); listed < 0) {
+    throw SourceError(errorText(-listed));
+  }
   std::vector<std::string> lights;
-  for (;;) {
-    // readdir reports an error only through errno, so it is cleared before every call.
-    errno = 0;
-    const dirent* entry = ::readdir(directory.get());
-    if (entry == nullptr) {
-      if (errno != 0) {
-        throw SourceError(errorText(errno));
-      }
-      break;
-    }
-    const std::string_view name = entry->d_name;
+  for (std::string& name : names) {
     if (name.empty() || name.front() == '.') {
       continue;
     }
     // The class directory holds symbolic links to the devices' LED directories; follow them.
     struct stat info = {};
-    if (::fstatat(classFd, entry->d_name, &info, 0) != 0 || !S_ISDIR(info.st_mode)) {
+    if (files_->statAt(classFd, name, info) != 0 || !S_ISDIR(info.st_mode)) {
       continue;
     }
     if (isBlueLight(splitLedName(name))) {
-      lights.emplace_back(name);
+      lights.push_back(std::move(name));
     }
   }
   std::sort(lights.begin(), lights.end());
@@ -175,7 +163,7 @@ std::vector<InstrumentationNode> SysfsLedSource::readNodes() const {
     InstrumentationNode node;
     node.type = NodeLexicon::NODE_TYPE_BLUE_LIGHT;
     node.description = kSysfsLedDescription;
-    if (const std::optional<unsigned int> state = readLedState(classFd, light)) {
+    if (const std::optional<unsigned int> state = readLedState(*files_, classFd, light)) {
       node.status = kStatusReadable;
       node.properties.push_back({NodeLexicon::PROPERTY_ALARM_STATE, *state});
     }

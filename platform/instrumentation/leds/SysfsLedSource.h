@@ -2,12 +2,14 @@
 #ifndef KESTA_PLATFORM_INSTRUMENTATION_LEDS_SYSFSLEDSOURCE_H
 #define KESTA_PLATFORM_INSTRUMENTATION_LEDS_SYSFSLEDSOURCE_H
 
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 #include "instrumentation/InstrumentationSource.h"
+#include "os/FileSystem.h"
 
 namespace Kesta {
 namespace platform {
@@ -49,7 +51,10 @@ std::optional<unsigned int> ledAlarmState(std::string_view trigger,
 
 class SysfsLedSource final : public InstrumentationSource {
  public:
-  explicit SysfsLedSource(std::string directory) : directory_(std::move(directory)) {}
+  // The class folder is read through `files`: the real file system, or a test's.
+  explicit SysfsLedSource(std::string directory,
+                          std::shared_ptr<FileSystem> files = systemFileSystem())
+      : directory_(std::move(directory)), files_(std::move(files)) {}
 
   std::string name() const override { return "sysfs:" + directory_; }
   // One node of type 26 per blue light, sorted by directory name; path text = directory name,
@@ -60,6 +65,7 @@ class SysfsLedSource final : public InstrumentationSource {
 
  private:
   std::string directory_;
+  std::shared_ptr<FileSystem> files_;
 };
 
 }  // namespace platform

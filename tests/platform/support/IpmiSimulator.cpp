@@ -282,19 +282,32 @@ std::string IpmiSimulator::sourceText(const std::string& options) const {
 }
 
 void IpmiSimulator::identify(const std::vector<std::uint8_t>& data) const {
+  command(0x00, 0x04, data, "Chassis Identify");
+}
+
+void IpmiSimulator::letTimePass(std::chrono::seconds seconds) const {
+  if (seconds.count() < 0 || seconds.count() > 255) {
+    throw std::invalid_argument("the simulated BMC moves its clock by 0 to 255 s at a time");
+  }
+  command(0x30, 0x01, {static_cast<std::uint8_t>(seconds.count())}, "Let Time Pass");
+}
+
+void IpmiSimulator::command(std::uint8_t netFn, std::uint8_t command,
+                            const std::vector<std::uint8_t>& data, const std::string& what) const {
   using namespace Kesta::platform;
   IpmiLanTarget target;
   target.host = "127.0.0.1";
   target.port = port_;
   target.credentials = readIpmiCredentials(keeperCredentials_);
   const IpmiLanTransport transport(std::move(target));
+  // Only a bound for a simulator that hangs; no test measures it.
   const IpmiResponse response =
-      transport.transact({0x00, 0x04, data}, IpmiClock::now() + std::chrono::seconds(3));
+      transport.transact({netFn, command, data}, IpmiClock::now() + std::chrono::seconds(3));
   if (!response.answered) {
-    throw std::runtime_error("Chassis Identify was not answered: " + response.failure);
+    throw std::runtime_error(what + " was not answered: " + response.failure);
   }
   if (response.data.empty() || response.data[0] != 0x00) {
-    throw std::runtime_error("Chassis Identify was refused");
+    throw std::runtime_error(what + " was refused");
   }
 }
 

@@ -73,10 +73,17 @@ class IpmiSimulator {
   // throws std::runtime_error unless the BMC accepts it.
   //   identify({})        on for 15 s       identify({0})     off
   //   identify({n})       on for n seconds  identify({0, 1})  on until switched off
+  // The seconds are those of the simulated BMC's own clock, which stands still until
+  // letTimePass moves it.
   void identify(const std::vector<std::uint8_t>& data) const;
+  // Moves the simulated BMC's clock on (0 to 255 s); a timed identify whose seconds are up ends.
+  void letTimePass(std::chrono::seconds seconds) const;
 
  private:
   bool startOnce(const SimulatorOptions& options, std::string& why);
+  // Sends one request as the administrator account; throws unless it is answered with 00h.
+  void command(std::uint8_t netFn, std::uint8_t command, const std::vector<std::uint8_t>& data,
+               const std::string& what) const;
 
   testsupport::TempDir dir_;
   std::string readerCredentials_;
