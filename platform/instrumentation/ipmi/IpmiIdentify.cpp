@@ -3,8 +3,6 @@
 #include <array>
 #include <cstdio>
 
-#include "KestaInstrumentation.h"
-
 namespace Kesta {
 namespace platform {
 
@@ -17,12 +15,6 @@ constexpr std::size_t kMiscByte = 3;
 constexpr std::uint8_t kIdentifyReported = 0x40;
 constexpr unsigned int kIdentifyShift = 4;
 constexpr std::uint8_t kIdentifyMask = 0x03;
-
-constexpr unsigned int kStatusOk = 1;
-constexpr unsigned int kStatusNone = 0;
-constexpr unsigned int kAlarmOff = 1;
-constexpr unsigned int kAlarmSteady = 2;
-constexpr unsigned int kAlarmAlternating = 3;
 
 struct NamedCode {
   std::uint8_t code;
@@ -99,35 +91,6 @@ IdentifyReading decodeChassisStatus(const std::uint8_t* answer, std::size_t size
       return IdentifyReading::unusable(
           "Get Chassis Status reports the reserved identify state 11b");
   }
-}
-
-unsigned int identifyAlarmState(IdentifyState state, OnReport onReport) {
-  if (state == IdentifyState::Off) {
-    return kAlarmOff;
-  }
-  return onReport == OnReport::Steady ? kAlarmSteady : kAlarmAlternating;
-}
-
-InstrumentationNode identifyNode(const IdentifyReading& reading, const std::string& path,
-                                 const std::string& description, OnReport onReport) {
-  InstrumentationNode node;
-  node.type = NodeLexicon::NODE_TYPE_BLUE_LIGHT;
-  node.path = path;
-  node.description = description;
-  switch (reading.kind) {
-    case IdentifyReading::Kind::Known:
-      node.status = kStatusOk;
-      node.properties.push_back(
-          {NodeLexicon::PROPERTY_ALARM_STATE, identifyAlarmState(reading.state, onReport)});
-      break;
-    case IdentifyReading::Kind::NotReported:
-      node.status = kStatusNone;
-      break;
-    case IdentifyReading::Kind::Unusable:
-      node.status = kIpmiStatusUnreadable;
-      break;
-  }
-  return node;
 }
 
 }  // namespace platform

@@ -1,5 +1,5 @@
-// What a BMC's answer to Get Chassis Status says about the chassis identify light, and the node
-// the IPMI sources make of it. Pure functions: no I/O, so every answer can be tested as bytes.
+// What a BMC's answer to Get Chassis Status says about the chassis identify light (the node made
+// of it is IdentifyLight.h's). Pure functions: no I/O, so every answer can be tested as bytes.
 #ifndef KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMIIDENTIFY_H
 #define KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMIIDENTIFY_H
 
@@ -8,7 +8,7 @@
 #include <string>
 #include <vector>
 
-#include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/IdentifyLight.h"
 
 namespace Kesta {
 namespace platform {
@@ -18,32 +18,8 @@ namespace platform {
 constexpr std::uint8_t kIpmiChassisNetFn = 0x00;
 constexpr std::uint8_t kIpmiGetChassisStatus = 0x01;
 
-// The node status of a light whose state could not be read (the module shows it as degraded).
-constexpr unsigned int kIpmiStatusUnreadable = 21;
-
-enum class IdentifyState {
-  Off,
-  TimedOn,  // on for an interval the BMC counts down
-  IndefinitelyOn
-};
-
-// The identify light as one answer describes it.
-struct IdentifyReading {
-  enum class Kind {
-    Known,        // `state` holds the state
-    NotReported,  // the BMC answered but does not report an identify state
-    Unusable      // the answer cannot be used; `problem` says why
-  };
-  Kind kind = Kind::Unusable;
-  IdentifyState state = IdentifyState::Off;
-  std::string problem;
-
-  static IdentifyReading known(IdentifyState state) { return {Kind::Known, state, {}}; }
-  static IdentifyReading notReported() { return {Kind::NotReported, IdentifyState::Off, {}}; }
-  static IdentifyReading unusable(std::string problem) {
-    return {Kind::Unusable, IdentifyState::Off, std::move(problem)};
-  }
-};
+// The node status of a light whose state could not be read.
+constexpr unsigned int kIpmiStatusUnreadable = kIdentifyStatusUnreadable;
 
 // Decodes an answer to Get Chassis Status: the completion code, then current power state, last
 // power event and the misc chassis state byte (and optionally more, which is ignored). In the
@@ -58,20 +34,6 @@ inline IdentifyReading decodeChassisStatus(const std::vector<std::uint8_t>& answ
 
 // A completion code in words for log lines, e.g. "C1h (invalid command)".
 std::string completionCodeText(std::uint8_t code);
-
-// How a light that is on is reported: identify lights blink, so "alternating" is the default;
-// lights that glow steadily are configured as "steady".
-enum class OnReport { Alternating, Steady };
-
-// The alarm state (node property 1) for a known state: 1 off, 3 alternating or 2 steady on.
-unsigned int identifyAlarmState(IdentifyState state, OnReport onReport);
-
-// The blue-light node of one BMC:
-//   Known        -> status 1 and property 1 (identifyAlarmState)
-//   NotReported  -> status 0, no property
-//   Unusable     -> status 21 (degraded), no property
-InstrumentationNode identifyNode(const IdentifyReading& reading, const std::string& path,
-                                 const std::string& description, OnReport onReport);
 
 }  // namespace platform
 }  // namespace Kesta

@@ -6,6 +6,7 @@
 
 #include "KestaCommonBase.h"
 #include "VNLog.h"
+#include "instrumentation/SourceOptions.h"
 #include "instrumentation/ipmi/IpmiCredentials.h"
 #include "instrumentation/ipmi/IpmiDeviceTransport.h"
 #include "instrumentation/ipmi/IpmiLanTransport.h"
@@ -25,164 +26,23 @@ constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
 constexpr int kFailureLevel = 6000;
 
 bool isDigit(char c) { return c >= '0' && c <= '9'; }
-bool isHexDigit(char c) { return isDigit(c) || (c >= 'a' && c <= 'f') || (c >= 'A' && c <= 'F'); }
-int hexValue(char c) {
-  if (isDigit(c)) {
-    return c - '0';
-  }
-  return asciiLower(c) - 'a' + 10;
-}
-
-std::string percentDecoded(std::string_view value, std::string_view name) {
-  std::string decoded;
-  decoded.reserve(value.size());
-  for (std::size_t i = 0; i < value.size(); ++i) {
-    if (value[i] != '%') {
-      decoded += value[i];
-      continue;
-    }
-    if (i + 2 >= value.size() || !isHexDigit(value[i + 1]) || !isHexDigit(value[i + 2])) {
-      throw SourceError("the value of \"" + std::string(name) +
-                        "\" has a '%' that is not followed by two hexadecimal digits");
-    }
-    decoded += static_cast<char>(hexValue(value[i + 1]) * 16 + hexValue(value[i + 2]));
-    i += 2;
-  }
-  return decoded;
-}
-
-// The name=value pairs of "?<options>" (or of nothing), decoded. Every name at most once.
-std::map<std::string, std::string> parseOptionList(std::string_view text) {
-  std::map<std::string, std::string> options;
-  if (text.empty()) {
-    return options;
-  }
-  text.remove_prefix(1);  // the '?'
-  for (;;) {
-    const std::string_view::size_type end = text.find('&');
-    const std::string_view item = text.substr(0, end);
-    const std::string_view::size_type equals = item.find('=');
-    if (item.empty() || equals == std::string_view::npos || equals == 0) {
-      throw SourceError("the options after '?' must be name=value pairs joined by '&'");
-    }
-    const std::string name(item.substr(0, equals));
-    std::string value = percentDecoded(item.substr(equals + 1), name);
-    if (!options.emplace(name, std::move(value)).second) {
-      throw SourceError("the option \"" + printable(name) + "\" is given twice");
-    }
-    if (end == std::string_view::npos) {
-      break;
-    }
-    text.remove_prefix(end + 1);
-  }
-  return options;
-}
-
-std::chrono::milliseconds parseTimeout(const std::string& text) {
-  const auto bad = [&text]() -> SourceError {
-    return SourceError("timeout=" + printable(text) +
-                       " is not a duration such as 1, 0.5, 2.25 (seconds) or 250ms");
-  };
-  std::string_view number = text;
-  long long scale = 1000;  // milliseconds per unit
-  if (number.size() > 2 && number.substr(number.size() - 2) == "ms") {
-    number.remove_suffix(2);
-    scale = 1;
-  } else if (number.size() > 1 && number.back() == 's') {
-    number.remove_suffix(1);
-  }
-  const std::string_view::size_type point = number.find('.');
-  const std::string_view whole = number.substr(0, point);
-  const std::string_view fraction =
-      point == std::string_view::npos ? std::string_view() : number.substr(point + 1);
-  if (whole.empty() || whole.size() > 6 || !std::all_of(whole.begin(), whole.end(), isDigit) ||
-      (point != std::string_view::npos &&
-       (fraction.empty() || !std::all_of(fraction.begin(), fraction.end(), isDigit)))) {
-    throw bad();
-  }
-  // Milliseconds are the finest unit the timeout has; finer fractions would be silently lost.
-  if ((scale == 1 && !fraction.empty()) || fraction.size() > 3) {
-    throw SourceError("timeout=" + printable(text) + " is finer than a millisecond");
-  }
-  long long milliseconds = std::stoll(std::string(whole)) * scale;
-  if (!fraction.empty()) {
-    std::string padded(fraction);
-    padded.resize(3, '0');
-    milliseconds += std::stoll(padded);
-  }
-  const std::chrono::milliseconds timeout(milliseconds);
-  if (timeout < kIpmiShortestTimeout || timeout > kIpmiLongestTimeout) {
-    throw SourceError("timeout=" + printable(text) + " is outside 10 ms to 60 s");
-  }
-  return timeout;
-}
-
-OnReport parseOn(const std::string& text) {
-  if (equalsIgnoringCase(text, "alternating")) {
-    return OnReport::Alternating;
-  }
-  if (equalsIgnoringCase(text, "steady")) {
-    return OnReport::Steady;
-  }
-  throw SourceError("on=" + printable(text) + " must be on=alternating or on=steady");
-}
-
-std::string parseDescription(const std::string& text) {
-  if (stripSpaces(text).empty()) {
-    throw SourceError("description= names no description");
-  }
-  if (!isValidUtf8(text) || std::any_of(text.begin(), text.end(), [](char c) {
-        return (static_cast<unsigned char>(c) < 0x20) || c == 0x7f;
-      })) {
-    throw SourceError("description= must be UTF-8 text without control characters");
-  }
-  return text;
-}
 
 // Takes the shared options out of `options`; whatever remains is unknown.
 IpmiSourceOptions takeSharedOptions(std::map<std::string, std::string>& options) {
   IpmiSourceOptions shared;
   if (auto found = options.find("description"); found != options.end()) {
-    shared.description = parseDescription(found->second);
+    shared.description = parseDescriptionOption(found->second);
     options.erase(found);
   }
   if (auto found = options.find("timeout"); found != options.end()) {
-    shared.timeout = parseTimeout(found->second);
+    shared.timeout = parseTimeoutOption(found->second, kIpmiShortestTimeout, kIpmiLongestTimeout);
     options.erase(found);
   }
   if (auto found = options.find("on"); found != options.end()) {
-    shared.onReport = parseOn(found->second);
+    shared.onReport = parseOnOption(found->second);
     options.erase(found);
   }
   return shared;
-}
-
-void refuseUnknown(const std::map<std::string, std::string>& options, const char* expected) {
-  if (!options.empty()) {
-    throw SourceError("unknown option \"" + printable(options.begin()->first) + "\" (expected " +
-                      expected + ")");
-  }
-}
-
-// Splits "<head>?<options>" into "<head>" and "?<options>" (keeping the '?', so that a lone '?'
-// is told apart from no options at all).
-std::pair<std::string_view, std::string_view> splitAtQuestionMark(std::string_view rest) {
-  const std::string_view::size_type question = rest.find('?');
-  if (question == std::string_view::npos) {
-    return {rest, std::string_view()};
-  }
-  return {rest.substr(0, question), rest.substr(question)};
-}
-
-unsigned int parsePort(std::string_view text) {
-  if (text.empty() || text.size() > 5 || !std::all_of(text.begin(), text.end(), isDigit)) {
-    throw SourceError("the port \"" + printable(text) + "\" is not a number from 1 to 65535");
-  }
-  const unsigned long port = std::stoul(std::string(text));
-  if (port == 0 || port > 65535) {
-    throw SourceError("the port \"" + printable(text) + "\" is not a number from 1 to 65535");
-  }
-  return static_cast<unsigned int>(port);
 }
 
 bool isHostNameCharacter(char c) {
@@ -209,7 +69,7 @@ IpmiDeviceSourceSettings parseIpmiDeviceSource(std::string_view rest) {
   std::map<std::string, std::string> options = parseOptionList(optionText);
   IpmiDeviceSourceSettings settings;
   settings.options = takeSharedOptions(options);
-  refuseUnknown(options, "description, timeout or on");
+  refuseUnknownOptions(options, "description, timeout or on");
   if (device.empty()) {
     settings.device = kDefaultIpmiDevice;
   } else if (device.front() != '/') {
@@ -268,7 +128,7 @@ IpmiLanSourceSettings parseIpmiLanSource(std::string_view rest) {
   }
   settings.host = asciiLowerCopy(host);
   if (!port.empty()) {
-    settings.port = parsePort(port);
+    settings.port = parsePortText(port);
   }
 
   std::map<std::string, std::string> options = parseOptionList(optionText);
@@ -277,7 +137,7 @@ IpmiLanSourceSettings parseIpmiLanSource(std::string_view rest) {
     settings.credentialsFile = found->second;
     options.erase(found);
   }
-  refuseUnknown(options, "credentials, description, timeout or on");
+  refuseUnknownOptions(options, "credentials, description, timeout or on");
   if (settings.credentialsFile.empty()) {
     throw SourceError(
         "a BMC on the network needs credentials=<file>, a file that only its owner can read");
