@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "BlueLightNames.h"
+#include "BrokerReport.h"
 #include "KestaCommon.h"
 
 namespace Kesta {
@@ -28,25 +29,6 @@ inline CMPIStatus noBrokerStatus() { return CMPIStatus{CMPI_RC_ERR_FAILED, nullp
 inline CMPICount keyCountOf(const CMPIObjectPath* path, CMPIStatus* status) {
   if (CMIsNullObject(path)) return 0;
   return CMGetKeyCount(path, status);
-}
-
-// Reports a failure: `status` becomes CMPI_RC_ERR_FAILED with `statusText` as its message, and
-// `traceText` goes to the broker's trace as a warning from `component`. The two texts of one
-// failure often differ on purpose. Without a broker there is neither a message nor a trace.
-inline void reportFailure(const CMPIBroker* broker, const char* component, CMPIStatus* status,
-                          const char* statusText, const char* traceText) {
-  if (status != nullptr) {
-    status->rc = CMPI_RC_ERR_FAILED;
-    status->msg = broker != nullptr ? CMNewString(broker, statusText, nullptr) : nullptr;
-  }
-  if (broker != nullptr) {
-    CMTraceMessage(broker, kBrokerTraceWarning, component, traceText, nullptr);
-  }
-}
-
-// Sends a warning to the broker's trace without touching any status.
-inline void traceWarning(const CMPIBroker* broker, const char* component, const char* text) {
-  if (broker != nullptr) CMTraceMessage(broker, kBrokerTraceWarning, component, text, nullptr);
 }
 
 // The failure of a GetInstance whose object path carries no key.

@@ -72,9 +72,9 @@ int bluelightElementCapabilitiesCMPIInstances(const CMPIObjectPath* ref, const c
 
   std::vector<CMPIObjectPath*> lightPaths;
   if (factory.getAllBlueLightCMPIObjPaths(mb, ref, lightPaths, &localStatus) != 0) {
-    traceWarning(mb, component,
-                 "***Can't get BlueLight ObjectPaths.             Exiting "
-                 "EnumerateInstanceNames***");
+    traceToBroker(mb, kBrokerTraceWarning, component,
+                  "***Can't get BlueLight ObjectPaths.             Exiting "
+                  "EnumerateInstanceNames***");
     return 1;
   }
 
@@ -93,9 +93,9 @@ int bluelightElementCapabilitiesCMPIInstances(const CMPIObjectPath* ref, const c
     factory.getNumberOfInstances();
     capPaths.reserve(1);
     if (factory.getAllBlueLightCapabilitiesCMPIObjPaths(mb, ref, capPaths, &localStatus) != 0) {
-      traceWarning(mb, component,
-                   "***Can't get ObjectPaths for                 Capabilities                 "
-                   "Exiting EnumerateInstanceNames***");
+      traceToBroker(mb, kBrokerTraceWarning, component,
+                    "***Can't get ObjectPaths for                 Capabilities                 "
+                    "Exiting EnumerateInstanceNames***");
       return 1;
     }
 

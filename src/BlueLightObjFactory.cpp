@@ -9,6 +9,7 @@
 
 #include "BlueLight.h"
 #include "BlueLightNames.h"
+#include "BrokerReport.h"
 #include "KestaCommon.h"
 #include "KestaLocale.h"
 #include "KestaTrace.h"
@@ -22,19 +23,6 @@ static const std::string loggerBlueLightObjFactory("Varnel.BlueLightObjFactory")
 namespace {
 
 constexpr const char* kSourceFile = "BlueLightObjFactory.cpp";
-
-// Fills a caller's status with a failure; a null status pointer is left alone.
-void setFailure(const CMPIBroker* broker, CMPIStatus* status, const char* text) {
-  if (status == nullptr) return;
-  status->rc = CMPI_RC_ERR_FAILED;
-  status->msg = broker != nullptr ? CMNewString(broker, text, nullptr) : nullptr;
-}
-
-// Sends a text to the broker's trace facility, ignoring its outcome.
-void traceToBroker(const CMPIBroker* broker, int level, const char* component, const char* text) {
-  if (broker == nullptr) return;
-  CMTraceMessage(broker, level, component, text, nullptr);
-}
 
 // The names of a property list (up to its first null entry), each mapped to itself.
 std::map<std::string, std::string> requestedPropertiesOf(const char** properties) {
@@ -167,8 +155,7 @@ int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
     CMPIObjectPath* path =
         CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightClass, status);
     if (!isUsable(path)) {
-      setFailure(broker, status, "Create CMPIObjectPath failed.");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
+      reportFailure(broker, BlueLightProfileProvider, status, "Create CMPIObjectPath failed.",
                     "Create CMPIObjectPath                     failed for RecordLogClass.");
       return 2;
     }
@@ -206,8 +193,7 @@ int BlueLightFactory::getAllBlueLightCapabilitiesCMPIObjPaths(
     CMPIObjectPath* path =
         CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightCapabilitiesClass, status);
     if (!isUsable(path)) {
-      setFailure(broker, status, "Create CMPIObjectPath failed");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+      reportFailure(broker, BlueLightCapabilitiesProvider, status, "Create CMPIObjectPath failed",
                     "Create CMPIObjectPath failed for                     BlueLightCapabilities "
                     "class");
       return 2;
@@ -289,9 +275,8 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
     CMPIArray* array = newUint16Array(broker, bluelight.getOperationalStatus(), status);
     if (array == nullptr) {
       // The partly built instance is still handed out; the exit line is left out on purpose.
-      setFailure(broker, status,
-                 "Create Array for Property                         OperationalStatus failed.");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
+      reportFailure(broker, BlueLightProfileProvider, status,
+                    "Create Array for Property                         OperationalStatus failed.",
                     "Create Array for Property Operat                        ionalStatus failed.");
       return instance;
     }
@@ -395,10 +380,9 @@ CMPIInstance* BlueLightFactory::makeBlueLightCapabilitiesInstance(
             newUint16Array(broker, bluelightCapabilities.getAlarmStatesSupported(), status);
         if (array == nullptr) {
           // The two texts differ in the case of "array" and both are kept as they stand.
-          setFailure(broker, status,
-                     "Creating array for Property                         "
-                     "RequestedAlarmStatesSupported failed.");
-          traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+          reportFailure(broker, BlueLightCapabilitiesProvider, status,
+                        "Creating array for Property                         "
+                        "RequestedAlarmStatesSupported failed.",
                         "Creating Array for Property                         "
                         "RequestedAlarmStatesSupported failed.");
         } else {
