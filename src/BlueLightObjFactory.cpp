@@ -135,77 +135,92 @@ unsigned short BlueLightFactory::getNumberOfInstances() {
 // Object paths
 // ---------------------------------------------------------------------------------------------
 
-int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
-                                                  const CMPIObjectPath* ref,
-                                                  std::vector<CMPIObjectPath*>& objectPaths,
-                                                  CMPIStatus* status) {
+namespace {
+
+// What the object paths of one kind of record differ in.
+struct PathKind {
+  const char* className;
+  const char* component;          // the provider that the broker's trace names
+  int emptyTraceLevel;            // of the trace that there is no record at all
+  const char* failureStatusText;  // when the broker makes no path
+  const char* failureTraceText;
+};
+
+// The two kinds have always been reported with these differences (the level of the empty trace,
+// the full stop, "RecordLogClass", the runs of blanks); they are kept as they stand.
+const PathKind kLightPaths = {
+    BlueLightClass, BlueLightProfileProvider, kBrokerTraceInfo, "Create CMPIObjectPath failed.",
+    "Create CMPIObjectPath                     failed for RecordLogClass."};
+const PathKind kCapabilitiesPaths = {
+    BlueLightCapabilitiesClass, BlueLightCapabilitiesProvider, kBrokerTraceWarning,
+    "Create CMPIObjectPath failed",
+    "Create CMPIObjectPath failed for                     BlueLightCapabilities class"};
+
+// The keys of a light's path: its own class, its DeviceID and the system it belongs to.
+void addKeys(CMPIObjectPath* path, const BlueLight& light, const std::string& systemName) {
+  CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
+  CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
+  CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
+  CMAddKey(path, "SystemName", systemName.c_str(), CMPI_chars);
+}
+
+// The one key of the capabilities record's path.
+void addKeys(CMPIObjectPath* path, BlueLightCapabilities record,
+             const std::string& /*systemName*/) {
+  CMAddKey(path, "InstanceID", record.getInstanceID().c_str(), CMPI_chars);
+}
+
+// Appends the object path of every record of `records`, in key order, for the public method
+// named by `site`: 0 success, 1 no record, 2 the broker made no path (paths made before stay).
+template <typename Record>
+int appendObjectPaths(const TraceSite& site, const std::map<std::string, Record>& records,
+                      const PathKind& kind, const CMPIBroker* broker, const CMPIObjectPath* ref,
+                      std::vector<CMPIObjectPath*>& objectPaths, CMPIStatus* status) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
          << " status=" << status;
   };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
-  if (_blueLightMap.empty()) {
-    traceToBroker(broker, kBrokerTraceInfo, BlueLightProfileProvider, "***No instance found***");
+  if (records.empty()) {
+    traceToBroker(broker, kind.emptyTraceLevel, kind.component, "***No instance found***");
     return 1;
   }
 
-  for (const auto& entry : _blueLightMap) {
-    const BlueLight& light = entry.second;
+  for (const auto& entry : records) {
     CMPIObjectPath* path =
-        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightClass, status);
+        CMNewObjectPath(broker, nameSpaceOf(ref, status), kind.className, status);
     if (!isUsable(path)) {
-      reportFailure(broker, BlueLightProfileProvider, status, "Create CMPIObjectPath failed.",
-                    "Create CMPIObjectPath                     failed for RecordLogClass.");
+      reportFailure(broker, kind.component, status, kind.failureStatusText, kind.failureTraceText);
       return 2;
     }
+    // One system name for the host and the key that names the system.
     const std::string systemName = Kesta::getSystemName();
     CMSetNameSpace(path, nameSpaceOf(ref, status));
     CMSetHostname(path, systemName.c_str());
-    CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
-    CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
-    CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
-    CMAddKey(path, "SystemName", systemName.c_str(), CMPI_chars);
+    addKeys(path, entry.second, systemName);
     objectPaths.push_back(path);
   }
 
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
   return 0;
+}
+
+}  // namespace
+
+int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref,
+                                                  std::vector<CMPIObjectPath*>& objectPaths,
+                                                  CMPIStatus* status) {
+  return appendObjectPaths(KESTA_TRACE_SITE, _blueLightMap, kLightPaths, broker, ref, objectPaths,
+                           status);
 }
 
 int BlueLightFactory::getAllBlueLightCapabilitiesCMPIObjPaths(
     const CMPIBroker* broker, const CMPIObjectPath* ref, std::vector<CMPIObjectPath*>& objectPaths,
     CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
-         << " status=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  if (_capabilitiesMap.empty()) {
-    traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
-                  "***No instance found***");
-    return 1;
-  }
-
-  for (const auto& entry : _capabilitiesMap) {
-    BlueLightCapabilities record = entry.second;
-    CMPIObjectPath* path =
-        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightCapabilitiesClass, status);
-    if (!isUsable(path)) {
-      reportFailure(broker, BlueLightCapabilitiesProvider, status, "Create CMPIObjectPath failed",
-                    "Create CMPIObjectPath failed for                     BlueLightCapabilities "
-                    "class");
-      return 2;
-    }
-    CMSetNameSpace(path, nameSpaceOf(ref, status));
-    CMSetHostname(path, Kesta::getSystemName().c_str());
-    CMAddKey(path, "InstanceID", record.getInstanceID().c_str(), CMPI_chars);
-    objectPaths.push_back(path);
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendObjectPaths(KESTA_TRACE_SITE, _capabilitiesMap, kCapabilitiesPaths, broker, ref,
+                           objectPaths, status);
 }
 
 // ---------------------------------------------------------------------------------------------
@@ -303,50 +318,6 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
   return instance;
 }
 
-int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
-                                                  const CMPIObjectPath* ref, CMPIString* key,
-                                                  const char** properties,
-                                                  std::vector<CMPIInstance*>& instances,
-                                                  CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
-         << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  // A missing key or one without characters names no light.
-  const char* keyChars = charsOf(key, status);
-  if (keyChars == nullptr) return 1;
-  const auto found = _blueLightMap.find(std::string(keyChars));
-  if (found == _blueLightMap.end()) return 1;
-
-  instances.push_back(makeBlueLightInstance(broker, ref, found->second, properties, false, status));
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
-}
-
-int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
-                                                   const CMPIObjectPath* ref,
-                                                   const char** properties, bool isObjPath,
-                                                   std::vector<CMPIInstance*>& instances,
-                                                   CMPIStatus* status) {
-  // The last key has no leading blank; the line has always been written so.
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
-         << " isObjPath=" << isObjPath << " instances=" << &instances << "rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  for (const auto& entry : _blueLightMap) {
-    instances.push_back(
-        makeBlueLightInstance(broker, ref, entry.second, properties, isObjPath, status));
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
-}
-
 // ---------------------------------------------------------------------------------------------
 // Capabilities instances
 // ---------------------------------------------------------------------------------------------
@@ -396,45 +367,99 @@ CMPIInstance* BlueLightFactory::makeBlueLightCapabilitiesInstance(
   return result;
 }
 
+// ---------------------------------------------------------------------------------------------
+// Instances by key and all instances
+// ---------------------------------------------------------------------------------------------
+
+namespace {
+
+// The instance builder of one kind of record.
+template <typename Record>
+using MakeInstance = CMPIInstance* (BlueLightFactory::*)(const CMPIBroker*, const CMPIObjectPath*,
+                                                         Record, const char**, bool, CMPIStatus*);
+
+// Appends the instance of the record whose key is `key`, made with `make`, for the public method
+// named by `site`: 0 found, 1 not found (nothing appended, no exit line).
+template <typename Record>
+int appendInstanceOf(const TraceSite& site, BlueLightFactory& factory, MakeInstance<Record> make,
+                     const std::map<std::string, Record>& records, const CMPIBroker* broker,
+                     const CMPIObjectPath* ref, CMPIString* key, const char** properties,
+                     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
+         << " instances=" << &instances << " rc=" << status;
+  };
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  // A missing key or one without characters names no record.
+  const char* keyChars = charsOf(key, status);
+  if (keyChars == nullptr) return 1;
+  const auto found = records.find(std::string(keyChars));
+  if (found == records.end()) return 1;
+
+  instances.push_back((factory.*make)(broker, ref, found->second, properties, false, status));
+
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+// Appends the instance of every record of `records`, in key order, made with `make`, for the
+// public method named by `site`; always 0. `statusKey` labels the status in the parameter list.
+template <typename Record>
+int appendAllInstances(const TraceSite& site, BlueLightFactory& factory, MakeInstance<Record> make,
+                       const std::map<std::string, Record>& records, const char* statusKey,
+                       const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties,
+                       bool isObjPath, std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
+         << " isObjPath=" << isObjPath << " instances=" << &instances << statusKey << status;
+  };
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  for (const auto& entry : records) {
+    instances.push_back((factory.*make)(broker, ref, entry.second, properties, isObjPath, status));
+  }
+
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+}  // namespace
+
+int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref, CMPIString* key,
+                                                  const char** properties,
+                                                  std::vector<CMPIInstance*>& instances,
+                                                  CMPIStatus* status) {
+  return appendInstanceOf(KESTA_TRACE_SITE, *this, &BlueLightFactory::makeBlueLightInstance,
+                          _blueLightMap, broker, ref, key, properties, instances, status);
+}
+
+int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
+                                                   const CMPIObjectPath* ref,
+                                                   const char** properties, bool isObjPath,
+                                                   std::vector<CMPIInstance*>& instances,
+                                                   CMPIStatus* status) {
+  // The status key has no leading blank here; the line has always been written so.
+  return appendAllInstances(KESTA_TRACE_SITE, *this, &BlueLightFactory::makeBlueLightInstance,
+                            _blueLightMap, "rc=", broker, ref, properties, isObjPath, instances,
+                            status);
+}
+
 int BlueLightFactory::getAllBlueLightCapabilitiesCMPIInstances(
     const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties, bool isObjPath,
     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
-         << " isObjPath=" << isObjPath << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  for (const auto& entry : _capabilitiesMap) {
-    BlueLightCapabilities record = entry.second;
-    instances.push_back(
-        makeBlueLightCapabilitiesInstance(broker, ref, record, properties, isObjPath, status));
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendAllInstances(KESTA_TRACE_SITE, *this,
+                            &BlueLightFactory::makeBlueLightCapabilitiesInstance, _capabilitiesMap,
+                            " rc=", broker, ref, properties, isObjPath, instances, status);
 }
 
 int BlueLightFactory::getOneBlueLightCapabilitiesCMPIInstance(
     const CMPIBroker* broker, const CMPIObjectPath* ref, CMPIString* key, const char** properties,
     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
-         << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  const char* keyChars = charsOf(key, status);
-  if (keyChars == nullptr) return 1;
-  const auto found = _capabilitiesMap.find(std::string(keyChars));
-  if (found == _capabilitiesMap.end()) return 1;
-
-  BlueLightCapabilities record = found->second;
-  instances.push_back(
-      makeBlueLightCapabilitiesInstance(broker, ref, record, properties, false, status));
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendInstanceOf(KESTA_TRACE_SITE, *this,
+                          &BlueLightFactory::makeBlueLightCapabilitiesInstance, _capabilitiesMap,
+                          broker, ref, key, properties, instances, status);
 }
 
 // ---------------------------------------------------------------------------------------------
