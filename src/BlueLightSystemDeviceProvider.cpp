@@ -1,8 +1,6 @@
 // The provider of KESTA_BlueLightSystemDevice, the association of every computer system that the
 // object manager knows (GroupComponent) with every blue light (PartComponent). The computer
 // systems come from another provider, through the broker's up-calls.
-#include <strings.h>
-
 #include <atomic>
 #include <cstring>
 #include <string>
@@ -13,6 +11,7 @@
 #include "KestaCommon.h"
 #include "KestaTrace.h"
 #include "ProviderFrame.h"
+#include "text/Text.h"
 
 namespace Kesta {
 namespace BlueLightProvider {
@@ -56,10 +55,11 @@ bool startsThisAssociation(const CMPIObjectPath* source) {
 }
 
 // Whether a result class named by the client admits the target class: either of two names, in
-// any letter case. A null result class admits everything.
+// any letter case (CIM names are ASCII, so the folding is ASCII's whatever the locale). A null
+// result class admits everything.
 bool acceptsResultClass(const char* resultClass, const char* servedName, const char* schemaName) {
-  return resultClass == nullptr || strcasecmp(resultClass, servedName) == 0 ||
-         strcasecmp(resultClass, schemaName) == 0;
+  return resultClass == nullptr || platform::equalsIgnoringCase(resultClass, servedName) ||
+         platform::equalsIgnoringCase(resultClass, schemaName);
 }
 
 }  // namespace
