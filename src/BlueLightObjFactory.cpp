@@ -493,6 +493,17 @@ bool sameText(const char* first, const char* second) {
   return first != nullptr && second != nullptr && std::strcmp(first, second) == 0;
 }
 
+// The parameter list of both association-target methods. The class names go through the stream's
+// text inserter: a null one stops the list there.
+auto targetParameters(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                      const char* _RefLeftClass, const char* _RefRightClass, CMPIStatus* status) {
+  return [=](VNLog::VNMessageBuffer& list) {
+    std::ostream& stream = list << " broker=" << broker;
+    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
+           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
+  };
+}
+
 }  // namespace
 
 const char* BlueLightFactory::get_assoc_targetClass_Name(const CMPIBroker* broker,
@@ -500,12 +511,7 @@ const char* BlueLightFactory::get_assoc_targetClass_Name(const CMPIBroker* broke
                                                          const char* _RefLeftClass,
                                                          const char* _RefRightClass,
                                                          CMPIStatus* status) {
-  // The class names go through the stream's text inserter: a null one stops the list there.
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    std::ostream& stream = list << " broker=" << broker;
-    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
-           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
-  };
+  auto parameters = targetParameters(broker, ref, _RefLeftClass, _RefRightClass, status);
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
   // A null association class (sent by object managers when the client names none) matches no
@@ -526,11 +532,7 @@ CMPIObjectPath* BlueLightFactory::get_assoc_targetClass_ObjectPath(const CMPIBro
                                                                    const char* _RefLeftClass,
                                                                    const char* _RefRightClass,
                                                                    CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    std::ostream& stream = list << " broker=" << broker;
-    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
-           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
-  };
+  auto parameters = targetParameters(broker, ref, _RefLeftClass, _RefRightClass, status);
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
   CMPIObjectPath* result = nullptr;
