@@ -539,7 +539,7 @@ constexpr CMPIAssociationMIFT associationMIFunctions(
     const char* miName, decltype(CMPIAssociationMIFT::associators) associatorsOperation,
     decltype(CMPIAssociationMIFT::associatorNames) associatorNamesOperation,
     decltype(CMPIAssociationMIFT::references) referencesOperation,
-    decltype(CMPIAssociationMIFT::referenceNames) referenceNamesOperation) {
+    decltype(CMPIAssociationMIFT::referenceNames) referenceNamesOperation) noexcept {
   return CMPIAssociationMIFT{CMPICurrentVersion,   CMPICurrentVersion,     miName,
                              cleanupAssociationMI, associatorsOperation,   associatorNamesOperation,
                              referencesOperation,  referenceNamesOperation};

@@ -54,7 +54,7 @@ inline CMPIStatus refuseExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMP
 constexpr CMPIInstanceMIFT instanceMIFunctions(
     const char* miName, decltype(CMPIInstanceMIFT::enumerateInstanceNames) enumerateInstanceNames,
     decltype(CMPIInstanceMIFT::enumerateInstances) enumerateInstances,
-    decltype(CMPIInstanceMIFT::getInstance) getInstance) {
+    decltype(CMPIInstanceMIFT::getInstance) getInstance) noexcept {
   return CMPIInstanceMIFT{CMPICurrentVersion,   CMPICurrentVersion,     miName,
                           cleanupInstanceMI,    enumerateInstanceNames, enumerateInstances,
                           getInstance,          refuseCreateInstance,   refuseModifyInstance,

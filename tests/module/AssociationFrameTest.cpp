@@ -12,8 +12,6 @@ using Kesta::BlueLightProvider::Association;
 using Kesta::BlueLightProvider::AssociationEnd;
 using Kesta::BlueLightProvider::EndSource;
 
-const std::string kLogger = "Varnel.Test";
-
 const AssociationEnd kSystems = {"KESTA_ComputerSystem", "GroupComponent",
                                  EndSource::ComputerSystems, "KESTA_ComputerSystem",
                                  "CIM_ComputerSystem"};
@@ -21,11 +19,6 @@ const AssociationEnd kLights = {"KESTA_BlueLight", "PartComponent", EndSource::L
                                 "KESTA_BlueLight", "CIM_AlarmDevice"};
 const AssociationEnd kCapabilities = {"KESTA_BlueLightCapabilities", "Capabilities",
                                       EndSource::Capabilities, nullptr, nullptr};
-
-const Association kAssociation = {
-    "KESTA_Test", "TestProvider", kLogger, "Test.cpp",
-    false,        kSystems,       kLights, {"GroupComponent", "PartComponent"},
-    nullptr,      nullptr,        false,   " properties="};
 
 TEST(AssociationEnd, ResultClassesAdmitInAnyLetterCase) {
   EXPECT_TRUE(kLights.admits("KESTA_BlueLight"));
@@ -57,11 +50,16 @@ TEST(AssociationEnd, NullResultClassOrNoneToCheckAdmits) {
 }
 
 TEST(Association, EndOfClassIsExact) {
-  EXPECT_EQ(kAssociation.endOfClass("KESTA_ComputerSystem"), &kAssociation.first);
-  EXPECT_EQ(kAssociation.endOfClass("KESTA_BlueLight"), &kAssociation.second);
-  EXPECT_EQ(kAssociation.endOfClass("kesta_bluelight"), nullptr);
-  EXPECT_EQ(kAssociation.endOfClass("CIM_ComputerSystem"), nullptr);
-  EXPECT_EQ(kAssociation.endOfClass(nullptr), nullptr);
+  const std::string logger = "Varnel.Test";
+  const Association association = {
+      "KESTA_Test", "TestProvider", logger,  "Test.cpp",
+      false,        kSystems,       kLights, {"GroupComponent", "PartComponent"},
+      nullptr,      nullptr,        false,   " properties="};
+  EXPECT_EQ(association.endOfClass("KESTA_ComputerSystem"), &association.first);
+  EXPECT_EQ(association.endOfClass("KESTA_BlueLight"), &association.second);
+  EXPECT_EQ(association.endOfClass("kesta_bluelight"), nullptr);
+  EXPECT_EQ(association.endOfClass("CIM_ComputerSystem"), nullptr);
+  EXPECT_EQ(association.endOfClass(nullptr), nullptr);
 }
 
 }  // namespace
