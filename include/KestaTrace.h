@@ -10,6 +10,7 @@
 #include <ostream>
 #include <string>
 #include <type_traits>
+#include <utility>
 
 #include "VNLog.h"
 
@@ -126,6 +127,22 @@ void emitTracePara(const char* function, const char* file, int line, const std::
   VNLog::VNLogger::traceLevelMessage(function, file, line, category, level, nullptr, 0, 0, text);
 }
 
+// The function and source line that a line is written for. A helper that writes the entry and
+// exit lines of the function calling it takes them from that function (KESTA_TRACE_SITE), so
+// that the lines name the function that was called, not the helper.
+struct TraceSite {
+  const char* function;
+  int line;
+};
+
+// As emitTracePara(), for the function and line of `site`.
+template <typename ParameterWriter>
+void emitTracePara(const TraceSite& site, const char* file, const std::string& category, int level,
+                   MessageType type, ParameterWriter&& writeParameters) {
+  emitTracePara(site.function, file, site.line, category, level, type,
+                std::forward<ParameterWriter>(writeParameters));
+}
+
 // As emitTracePara() without a parameter list; `text` as for trace().
 inline void emitTrace(const char* function, const char* file, int line, const std::string& category,
                       int level, MessageType type, const char* text) {
@@ -163,5 +180,8 @@ class ProviderException : public std::exception {
   ::Kesta::emitTracePara(__func__, kSourceFile, __LINE__, (category), (level), (type), (writer))
 #define KESTA_TRACE(category, level, type, text) \
   ::Kesta::emitTrace(__func__, kSourceFile, __LINE__, (category), (level), (type), (text))
+// The calling function and line, for a helper that traces on its behalf.
+#define KESTA_TRACE_SITE \
+  ::Kesta::TraceSite { __func__, __LINE__ }
 
 #endif  // KESTA_TRACE_H

@@ -1,5 +1,7 @@
 // Small pieces of the operation frame that the four provider units share: the statuses they
-// return, the key checks of GetInstance, and the walk that picks instances by object path.
+// return, the operations that do nothing or are refused, the instance MI table, the parameter
+// lists of the instance operations, the key checks of GetInstance, and the walk that picks
+// instances by object path.
 #ifndef KESTA_PROVIDERFRAME_H
 #define KESTA_PROVIDERFRAME_H
 
@@ -10,7 +12,9 @@
 #include <vector>
 
 #include "BlueLightNames.h"
+#include "BrokerReport.h"
 #include "KestaCommon.h"
+#include "KestaTrace.h"
 
 namespace Kesta {
 namespace BlueLightProvider {
@@ -24,29 +28,61 @@ inline CMPIStatus notSupportedStatus() { return CMPIStatus{CMPI_RC_ERR_NOT_SUPPO
 // with, nor a message text; it fails plainly instead of crashing in the first broker call.
 inline CMPIStatus noBrokerStatus() { return CMPIStatus{CMPI_RC_ERR_FAILED, nullptr}; }
 
+// The module keeps nothing that cleanup could free, and it is read-only: what would create,
+// change, delete or query instances is refused alike by every provider.
+inline CMPIStatus cleanupInstanceMI(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+  return okStatus();
+}
+inline CMPIStatus refuseCreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*, const CMPIInstance*) {
+  return notSupportedStatus();
+}
+inline CMPIStatus refuseModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*, const CMPIInstance*, const char**) {
+  return notSupportedStatus();
+}
+inline CMPIStatus refuseDeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                       const CMPIObjectPath*) {
+  return notSupportedStatus();
+}
+inline CMPIStatus refuseExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
+                                  const CMPIObjectPath*, const char*, const char*) {
+  return notSupportedStatus();
+}
+
+// The instance MI table of a provider named `miName` that serves the three read operations.
+constexpr CMPIInstanceMIFT instanceMIFunctions(
+    const char* miName, decltype(CMPIInstanceMIFT::enumerateInstanceNames) enumerateInstanceNames,
+    decltype(CMPIInstanceMIFT::enumerateInstances) enumerateInstances,
+    decltype(CMPIInstanceMIFT::getInstance) getInstance) noexcept {
+  return CMPIInstanceMIFT{CMPICurrentVersion,   CMPICurrentVersion,     miName,
+                          cleanupInstanceMI,    enumerateInstanceNames, enumerateInstances,
+                          getInstance,          refuseCreateInstance,   refuseModifyInstance,
+                          refuseDeleteInstance, refuseExecQuery};
+}
+
+// The parameter list of EnumInstanceNames.
+inline auto enumerationParameters(const CMPIInstanceMI* mi, const CMPIContext* ctx,
+                                  const CMPIResult* result, const CMPIObjectPath* ref) {
+  return [=](VNLog::VNMessageBuffer& list) {
+    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " ref=" << ref;
+  };
+}
+
+// The parameter list of EnumInstances (`pathKey` " ref=") and GetInstance (" cop=").
+inline auto instanceParameters(const CMPIInstanceMI* mi, const CMPIContext* ctx,
+                               const CMPIResult* result, const char* pathKey,
+                               const CMPIObjectPath* path, const char** properties) {
+  return [=](VNLog::VNMessageBuffer& list) {
+    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << pathKey << path
+         << " properties=" << properties;
+  };
+}
+
 // The number of keys of `path`; a missing path has none.
 inline CMPICount keyCountOf(const CMPIObjectPath* path, CMPIStatus* status) {
   if (CMIsNullObject(path)) return 0;
   return CMGetKeyCount(path, status);
-}
-
-// Reports a failure: `status` becomes CMPI_RC_ERR_FAILED with `statusText` as its message, and
-// `traceText` goes to the broker's trace as a warning from `component`. The two texts of one
-// failure often differ on purpose. Without a broker there is neither a message nor a trace.
-inline void reportFailure(const CMPIBroker* broker, const char* component, CMPIStatus* status,
-                          const char* statusText, const char* traceText) {
-  if (status != nullptr) {
-    status->rc = CMPI_RC_ERR_FAILED;
-    status->msg = broker != nullptr ? CMNewString(broker, statusText, nullptr) : nullptr;
-  }
-  if (broker != nullptr) {
-    CMTraceMessage(broker, kBrokerTraceWarning, component, traceText, nullptr);
-  }
-}
-
-// Sends a warning to the broker's trace without touching any status.
-inline void traceWarning(const CMPIBroker* broker, const char* component, const char* text) {
-  if (broker != nullptr) CMTraceMessage(broker, kBrokerTraceWarning, component, text, nullptr);
 }
 
 // The failure of a GetInstance whose object path carries no key.

@@ -26,16 +26,10 @@ std::atomic<const CMPIBroker*> broker{nullptr};
 
 }  // namespace
 
-CMPIStatus BlueLightCapabilities_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
-  return okStatus();
-}
-
 CMPIStatus BlueLightCapabilities_EnumInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                                    const CMPIResult* result,
                                                    const CMPIObjectPath* ref) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " ref=" << ref;
-  };
+  auto parameters = enumerationParameters(mi, ctx, result, ref);
   KESTA_TRACE_PARA(loggerBlueLightCapabilitiesProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -63,10 +57,7 @@ CMPIStatus BlueLightCapabilities_EnumInstanceNames(CMPIInstanceMI* mi, const CMP
 CMPIStatus BlueLightCapabilities_EnumInstances(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                                const CMPIResult* result, const CMPIObjectPath* ref,
                                                const char** properties) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " ref=" << ref
-         << " properties=" << properties;
-  };
+  auto parameters = instanceParameters(mi, ctx, result, " ref=", ref, properties);
   KESTA_TRACE_PARA(loggerBlueLightCapabilitiesProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -89,10 +80,7 @@ CMPIStatus BlueLightCapabilities_EnumInstances(CMPIInstanceMI* mi, const CMPICon
 CMPIStatus BlueLightCapabilities_GetInstance(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                              const CMPIResult* result, const CMPIObjectPath* cop,
                                              const char** properties) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " cop=" << cop
-         << " properties=" << properties;
-  };
+  auto parameters = instanceParameters(mi, ctx, result, " cop=", cop, properties);
   KESTA_TRACE_PARA(loggerBlueLightCapabilitiesProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -129,43 +117,11 @@ CMPIStatus BlueLightCapabilities_GetInstance(CMPIInstanceMI* mi, const CMPIConte
   return status;
 }
 
-CMPIStatus BlueLightCapabilities_CreateInstance(CMPIInstanceMI*, const CMPIContext*,
-                                                const CMPIResult*, const CMPIObjectPath*,
-                                                const CMPIInstance*) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLightCapabilities_ModifyInstance(CMPIInstanceMI*, const CMPIContext*,
-                                                const CMPIResult*, const CMPIObjectPath*,
-                                                const CMPIInstance*, const char**) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLightCapabilities_DeleteInstance(CMPIInstanceMI*, const CMPIContext*,
-                                                const CMPIResult*, const CMPIObjectPath*) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLightCapabilities_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                           const CMPIObjectPath*, const char*, const char*) {
-  return notSupportedStatus();
-}
-
 namespace {
 
-CMPIInstanceMIFT instMIFT__ = {
-    CMPICurrentVersion,
-    CMPICurrentVersion,
-    "instanceBlueLightCapabilitiesProvider",
-    BlueLightCapabilities_Cleanup,
-    BlueLightCapabilities_EnumInstanceNames,
-    BlueLightCapabilities_EnumInstances,
-    BlueLightCapabilities_GetInstance,
-    BlueLightCapabilities_CreateInstance,
-    BlueLightCapabilities_ModifyInstance,
-    BlueLightCapabilities_DeleteInstance,
-    BlueLightCapabilities_ExecQuery,
-};
+CMPIInstanceMIFT instMIFT__ = instanceMIFunctions(
+    "instanceBlueLightCapabilitiesProvider", BlueLightCapabilities_EnumInstanceNames,
+    BlueLightCapabilities_EnumInstances, BlueLightCapabilities_GetInstance);
 
 }  // namespace
 }  // namespace BlueLightProvider

@@ -9,6 +9,7 @@
 
 #include "BlueLight.h"
 #include "BlueLightNames.h"
+#include "BrokerReport.h"
 #include "KestaCommon.h"
 #include "KestaLocale.h"
 #include "KestaTrace.h"
@@ -22,19 +23,6 @@ static const std::string loggerBlueLightObjFactory("Varnel.BlueLightObjFactory")
 namespace {
 
 constexpr const char* kSourceFile = "BlueLightObjFactory.cpp";
-
-// Fills a caller's status with a failure; a null status pointer is left alone.
-void setFailure(const CMPIBroker* broker, CMPIStatus* status, const char* text) {
-  if (status == nullptr) return;
-  status->rc = CMPI_RC_ERR_FAILED;
-  status->msg = broker != nullptr ? CMNewString(broker, text, nullptr) : nullptr;
-}
-
-// Sends a text to the broker's trace facility, ignoring its outcome.
-void traceToBroker(const CMPIBroker* broker, int level, const char* component, const char* text) {
-  if (broker == nullptr) return;
-  CMTraceMessage(broker, level, component, text, nullptr);
-}
 
 // The names of a property list (up to its first null entry), each mapped to itself.
 std::map<std::string, std::string> requestedPropertiesOf(const char** properties) {
@@ -147,79 +135,92 @@ unsigned short BlueLightFactory::getNumberOfInstances() {
 // Object paths
 // ---------------------------------------------------------------------------------------------
 
-int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
-                                                  const CMPIObjectPath* ref,
-                                                  std::vector<CMPIObjectPath*>& objectPaths,
-                                                  CMPIStatus* status) {
+namespace {
+
+// What the object paths of one kind of record differ in.
+struct PathKind {
+  const char* className;
+  const char* component;          // the provider that the broker's trace names
+  int emptyTraceLevel;            // of the trace that there is no record at all
+  const char* failureStatusText;  // when the broker makes no path
+  const char* failureTraceText;
+};
+
+// The two kinds have always been reported with these differences (the level of the empty trace,
+// the full stop, "RecordLogClass", the runs of blanks); they are kept as they stand.
+const PathKind kLightPaths = {
+    BlueLightClass, BlueLightProfileProvider, kBrokerTraceInfo, "Create CMPIObjectPath failed.",
+    "Create CMPIObjectPath                     failed for RecordLogClass."};
+const PathKind kCapabilitiesPaths = {
+    BlueLightCapabilitiesClass, BlueLightCapabilitiesProvider, kBrokerTraceWarning,
+    "Create CMPIObjectPath failed",
+    "Create CMPIObjectPath failed for                     BlueLightCapabilities class"};
+
+// The keys of a light's path: its own class, its DeviceID and the system it belongs to.
+void addKeys(CMPIObjectPath* path, const BlueLight& light, const std::string& systemName) {
+  CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
+  CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
+  CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
+  CMAddKey(path, "SystemName", systemName.c_str(), CMPI_chars);
+}
+
+// The one key of the capabilities record's path.
+void addKeys(CMPIObjectPath* path, BlueLightCapabilities record,
+             const std::string& /*systemName*/) {
+  CMAddKey(path, "InstanceID", record.getInstanceID().c_str(), CMPI_chars);
+}
+
+// Appends the object path of every record of `records`, in key order, for the public method
+// named by `site`: 0 success, 1 no record, 2 the broker made no path (paths made before stay).
+template <typename Record>
+int appendObjectPaths(const TraceSite& site, const std::map<std::string, Record>& records,
+                      const PathKind& kind, const CMPIBroker* broker, const CMPIObjectPath* ref,
+                      std::vector<CMPIObjectPath*>& objectPaths, CMPIStatus* status) {
   auto parameters = [&](VNLog::VNMessageBuffer& list) {
     list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
          << " status=" << status;
   };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
-  if (_blueLightMap.empty()) {
-    traceToBroker(broker, kBrokerTraceInfo, BlueLightProfileProvider, "***No instance found***");
+  if (records.empty()) {
+    traceToBroker(broker, kind.emptyTraceLevel, kind.component, "***No instance found***");
     return 1;
   }
 
-  for (const auto& entry : _blueLightMap) {
-    const BlueLight& light = entry.second;
+  for (const auto& entry : records) {
     CMPIObjectPath* path =
-        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightClass, status);
+        CMNewObjectPath(broker, nameSpaceOf(ref, status), kind.className, status);
     if (!isUsable(path)) {
-      setFailure(broker, status, "Create CMPIObjectPath failed.");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
-                    "Create CMPIObjectPath                     failed for RecordLogClass.");
+      reportFailure(broker, kind.component, status, kind.failureStatusText, kind.failureTraceText);
       return 2;
     }
+    // One system name for the host and the key that names the system.
     const std::string systemName = Kesta::getSystemName();
     CMSetNameSpace(path, nameSpaceOf(ref, status));
     CMSetHostname(path, systemName.c_str());
-    CMAddKey(path, "CreationClassName", BlueLightClass, CMPI_chars);
-    CMAddKey(path, "DeviceID", light.getDeviceID().c_str(), CMPI_chars);
-    CMAddKey(path, "SystemCreationClassName", ComputerSystemClass, CMPI_chars);
-    CMAddKey(path, "SystemName", systemName.c_str(), CMPI_chars);
+    addKeys(path, entry.second, systemName);
     objectPaths.push_back(path);
   }
 
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
   return 0;
+}
+
+}  // namespace
+
+int BlueLightFactory::getAllBlueLightCMPIObjPaths(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref,
+                                                  std::vector<CMPIObjectPath*>& objectPaths,
+                                                  CMPIStatus* status) {
+  return appendObjectPaths(KESTA_TRACE_SITE, _blueLightMap, kLightPaths, broker, ref, objectPaths,
+                           status);
 }
 
 int BlueLightFactory::getAllBlueLightCapabilitiesCMPIObjPaths(
     const CMPIBroker* broker, const CMPIObjectPath* ref, std::vector<CMPIObjectPath*>& objectPaths,
     CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " objectPaths=" << &objectPaths
-         << " status=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  if (_capabilitiesMap.empty()) {
-    traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
-                  "***No instance found***");
-    return 1;
-  }
-
-  for (const auto& entry : _capabilitiesMap) {
-    BlueLightCapabilities record = entry.second;
-    CMPIObjectPath* path =
-        CMNewObjectPath(broker, nameSpaceOf(ref, status), BlueLightCapabilitiesClass, status);
-    if (!isUsable(path)) {
-      setFailure(broker, status, "Create CMPIObjectPath failed");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
-                    "Create CMPIObjectPath failed for                     BlueLightCapabilities "
-                    "class");
-      return 2;
-    }
-    CMSetNameSpace(path, nameSpaceOf(ref, status));
-    CMSetHostname(path, Kesta::getSystemName().c_str());
-    CMAddKey(path, "InstanceID", record.getInstanceID().c_str(), CMPI_chars);
-    objectPaths.push_back(path);
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendObjectPaths(KESTA_TRACE_SITE, _capabilitiesMap, kCapabilitiesPaths, broker, ref,
+                           objectPaths, status);
 }
 
 // ---------------------------------------------------------------------------------------------
@@ -289,9 +290,8 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
     CMPIArray* array = newUint16Array(broker, bluelight.getOperationalStatus(), status);
     if (array == nullptr) {
       // The partly built instance is still handed out; the exit line is left out on purpose.
-      setFailure(broker, status,
-                 "Create Array for Property                         OperationalStatus failed.");
-      traceToBroker(broker, kBrokerTraceWarning, BlueLightProfileProvider,
+      reportFailure(broker, BlueLightProfileProvider, status,
+                    "Create Array for Property                         OperationalStatus failed.",
                     "Create Array for Property Operat                        ionalStatus failed.");
       return instance;
     }
@@ -316,50 +316,6 @@ CMPIInstance* BlueLightFactory::makeBlueLightInstance(const CMPIBroker* broker,
 
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
   return instance;
-}
-
-int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
-                                                  const CMPIObjectPath* ref, CMPIString* key,
-                                                  const char** properties,
-                                                  std::vector<CMPIInstance*>& instances,
-                                                  CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
-         << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  // A missing key or one without characters names no light.
-  const char* keyChars = charsOf(key, status);
-  if (keyChars == nullptr) return 1;
-  const auto found = _blueLightMap.find(std::string(keyChars));
-  if (found == _blueLightMap.end()) return 1;
-
-  instances.push_back(makeBlueLightInstance(broker, ref, found->second, properties, false, status));
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
-}
-
-int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
-                                                   const CMPIObjectPath* ref,
-                                                   const char** properties, bool isObjPath,
-                                                   std::vector<CMPIInstance*>& instances,
-                                                   CMPIStatus* status) {
-  // The last key has no leading blank; the line has always been written so.
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
-         << " isObjPath=" << isObjPath << " instances=" << &instances << "rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  for (const auto& entry : _blueLightMap) {
-    instances.push_back(
-        makeBlueLightInstance(broker, ref, entry.second, properties, isObjPath, status));
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
 }
 
 // ---------------------------------------------------------------------------------------------
@@ -395,10 +351,9 @@ CMPIInstance* BlueLightFactory::makeBlueLightCapabilitiesInstance(
             newUint16Array(broker, bluelightCapabilities.getAlarmStatesSupported(), status);
         if (array == nullptr) {
           // The two texts differ in the case of "array" and both are kept as they stand.
-          setFailure(broker, status,
-                     "Creating array for Property                         "
-                     "RequestedAlarmStatesSupported failed.");
-          traceToBroker(broker, kBrokerTraceWarning, BlueLightCapabilitiesProvider,
+          reportFailure(broker, BlueLightCapabilitiesProvider, status,
+                        "Creating array for Property                         "
+                        "RequestedAlarmStatesSupported failed.",
                         "Creating Array for Property                         "
                         "RequestedAlarmStatesSupported failed.");
         } else {
@@ -412,45 +367,99 @@ CMPIInstance* BlueLightFactory::makeBlueLightCapabilitiesInstance(
   return result;
 }
 
+// ---------------------------------------------------------------------------------------------
+// Instances by key and all instances
+// ---------------------------------------------------------------------------------------------
+
+namespace {
+
+// The instance builder of one kind of record.
+template <typename Record>
+using MakeInstance = CMPIInstance* (BlueLightFactory::*)(const CMPIBroker*, const CMPIObjectPath*,
+                                                         Record, const char**, bool, CMPIStatus*);
+
+// Appends the instance of the record whose key is `key`, made with `make`, for the public method
+// named by `site`: 0 found, 1 not found (nothing appended, no exit line).
+template <typename Record>
+int appendInstanceOf(const TraceSite& site, BlueLightFactory& factory, MakeInstance<Record> make,
+                     const std::map<std::string, Record>& records, const CMPIBroker* broker,
+                     const CMPIObjectPath* ref, CMPIString* key, const char** properties,
+                     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
+         << " instances=" << &instances << " rc=" << status;
+  };
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  // A missing key or one without characters names no record.
+  const char* keyChars = charsOf(key, status);
+  if (keyChars == nullptr) return 1;
+  const auto found = records.find(std::string(keyChars));
+  if (found == records.end()) return 1;
+
+  instances.push_back((factory.*make)(broker, ref, found->second, properties, false, status));
+
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+// Appends the instance of every record of `records`, in key order, made with `make`, for the
+// public method named by `site`; always 0. `statusKey` labels the status in the parameter list.
+template <typename Record>
+int appendAllInstances(const TraceSite& site, BlueLightFactory& factory, MakeInstance<Record> make,
+                       const std::map<std::string, Record>& records, const char* statusKey,
+                       const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties,
+                       bool isObjPath, std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
+  auto parameters = [&](VNLog::VNMessageBuffer& list) {
+    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
+         << " isObjPath=" << isObjPath << " instances=" << &instances << statusKey << status;
+  };
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
+
+  for (const auto& entry : records) {
+    instances.push_back((factory.*make)(broker, ref, entry.second, properties, isObjPath, status));
+  }
+
+  emitTracePara(site, kSourceFile, loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
+  return 0;
+}
+
+}  // namespace
+
+int BlueLightFactory::getOneBlueLightCMPIInstance(const CMPIBroker* broker,
+                                                  const CMPIObjectPath* ref, CMPIString* key,
+                                                  const char** properties,
+                                                  std::vector<CMPIInstance*>& instances,
+                                                  CMPIStatus* status) {
+  return appendInstanceOf(KESTA_TRACE_SITE, *this, &BlueLightFactory::makeBlueLightInstance,
+                          _blueLightMap, broker, ref, key, properties, instances, status);
+}
+
+int BlueLightFactory::getAllBlueLightCMPIInstances(const CMPIBroker* broker,
+                                                   const CMPIObjectPath* ref,
+                                                   const char** properties, bool isObjPath,
+                                                   std::vector<CMPIInstance*>& instances,
+                                                   CMPIStatus* status) {
+  // The status key has no leading blank here; the line has always been written so.
+  return appendAllInstances(KESTA_TRACE_SITE, *this, &BlueLightFactory::makeBlueLightInstance,
+                            _blueLightMap, "rc=", broker, ref, properties, isObjPath, instances,
+                            status);
+}
+
 int BlueLightFactory::getAllBlueLightCapabilitiesCMPIInstances(
     const CMPIBroker* broker, const CMPIObjectPath* ref, const char** properties, bool isObjPath,
     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " properties=" << properties
-         << " isObjPath=" << isObjPath << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  for (const auto& entry : _capabilitiesMap) {
-    BlueLightCapabilities record = entry.second;
-    instances.push_back(
-        makeBlueLightCapabilitiesInstance(broker, ref, record, properties, isObjPath, status));
-  }
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendAllInstances(KESTA_TRACE_SITE, *this,
+                            &BlueLightFactory::makeBlueLightCapabilitiesInstance, _capabilitiesMap,
+                            " rc=", broker, ref, properties, isObjPath, instances, status);
 }
 
 int BlueLightFactory::getOneBlueLightCapabilitiesCMPIInstance(
     const CMPIBroker* broker, const CMPIObjectPath* ref, CMPIString* key, const char** properties,
     std::vector<CMPIInstance*>& instances, CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " broker=" << broker << " ref=" << ref << " key=" << key << " properties=" << properties
-         << " instances=" << &instances << " rc=" << status;
-  };
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
-
-  const char* keyChars = charsOf(key, status);
-  if (keyChars == nullptr) return 1;
-  const auto found = _capabilitiesMap.find(std::string(keyChars));
-  if (found == _capabilitiesMap.end()) return 1;
-
-  BlueLightCapabilities record = found->second;
-  instances.push_back(
-      makeBlueLightCapabilitiesInstance(broker, ref, record, properties, false, status));
-
-  KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, EXITING, parameters);
-  return 0;
+  return appendInstanceOf(KESTA_TRACE_SITE, *this,
+                          &BlueLightFactory::makeBlueLightCapabilitiesInstance, _capabilitiesMap,
+                          broker, ref, key, properties, instances, status);
 }
 
 // ---------------------------------------------------------------------------------------------
@@ -484,6 +493,17 @@ bool sameText(const char* first, const char* second) {
   return first != nullptr && second != nullptr && std::strcmp(first, second) == 0;
 }
 
+// The parameter list of both association-target methods. The class names go through the stream's
+// text inserter: a null one stops the list there.
+auto targetParameters(const CMPIBroker* broker, const CMPIObjectPath* ref,
+                      const char* _RefLeftClass, const char* _RefRightClass, CMPIStatus* status) {
+  return [=](VNLog::VNMessageBuffer& list) {
+    std::ostream& stream = list << " broker=" << broker;
+    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
+           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
+  };
+}
+
 }  // namespace
 
 const char* BlueLightFactory::get_assoc_targetClass_Name(const CMPIBroker* broker,
@@ -491,12 +511,7 @@ const char* BlueLightFactory::get_assoc_targetClass_Name(const CMPIBroker* broke
                                                          const char* _RefLeftClass,
                                                          const char* _RefRightClass,
                                                          CMPIStatus* status) {
-  // The class names go through the stream's text inserter: a null one stops the list there.
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    std::ostream& stream = list << " broker=" << broker;
-    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
-           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
-  };
+  auto parameters = targetParameters(broker, ref, _RefLeftClass, _RefRightClass, status);
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
   // A null association class (sent by object managers when the client names none) matches no
@@ -517,11 +532,7 @@ CMPIObjectPath* BlueLightFactory::get_assoc_targetClass_ObjectPath(const CMPIBro
                                                                    const char* _RefLeftClass,
                                                                    const char* _RefRightClass,
                                                                    CMPIStatus* status) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    std::ostream& stream = list << " broker=" << broker;
-    stream << " ref=" << ref << " _RefLeftClass=" << _RefLeftClass
-           << " _RefRightClass=" << _RefRightClass << " rc=" << status;
-  };
+  auto parameters = targetParameters(broker, ref, _RefLeftClass, _RefRightClass, status);
   KESTA_TRACE_PARA(loggerBlueLightObjFactory, kTraceLevel, ENTERING, parameters);
 
   CMPIObjectPath* result = nullptr;

@@ -26,15 +26,9 @@ std::atomic<const CMPIBroker*> broker{nullptr};
 
 }  // namespace
 
-CMPIStatus BlueLight_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
-  return okStatus();
-}
-
 CMPIStatus BlueLight_EnumInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                        const CMPIResult* result, const CMPIObjectPath* ref) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " ref=" << ref;
-  };
+  auto parameters = enumerationParameters(mi, ctx, result, ref);
   KESTA_TRACE_PARA(loggerBlueLightProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -61,10 +55,7 @@ CMPIStatus BlueLight_EnumInstanceNames(CMPIInstanceMI* mi, const CMPIContext* ct
 CMPIStatus BlueLight_EnumInstances(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                    const CMPIResult* result, const CMPIObjectPath* ref,
                                    const char** properties) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " ref=" << ref
-         << " properties=" << properties;
-  };
+  auto parameters = instanceParameters(mi, ctx, result, " ref=", ref, properties);
   KESTA_TRACE_PARA(loggerBlueLightProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -87,10 +78,7 @@ CMPIStatus BlueLight_EnumInstances(CMPIInstanceMI* mi, const CMPIContext* ctx,
 CMPIStatus BlueLight_GetInstance(CMPIInstanceMI* mi, const CMPIContext* ctx,
                                  const CMPIResult* result, const CMPIObjectPath* cop,
                                  const char** properties) {
-  auto parameters = [&](VNLog::VNMessageBuffer& list) {
-    list << " mi=" << mi << " ctx=" << ctx << " result=" << result << " cop=" << cop
-         << " properties=" << properties;
-  };
+  auto parameters = instanceParameters(mi, ctx, result, " cop=", cop, properties);
   KESTA_TRACE_PARA(loggerBlueLightProvider, kTraceLevel, ENTERING, parameters);
   CMPIStatus status = okStatus();
   const CMPIBroker* const mb = broker.load();
@@ -130,34 +118,11 @@ CMPIStatus BlueLight_GetInstance(CMPIInstanceMI* mi, const CMPIContext* ctx,
   return status;
 }
 
-CMPIStatus BlueLight_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                    const CMPIObjectPath*, const CMPIInstance*) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLight_ModifyInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                    const CMPIObjectPath*, const CMPIInstance*, const char**) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLight_DeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                                    const CMPIObjectPath*) {
-  return notSupportedStatus();
-}
-
-CMPIStatus BlueLight_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*,
-                               const CMPIObjectPath*, const char*, const char*) {
-  return notSupportedStatus();
-}
-
 namespace {
 
-CMPIInstanceMIFT instMIFT__ = {
-    CMPICurrentVersion,       CMPICurrentVersion,          "instanceBlueLightProfileProvider",
-    BlueLight_Cleanup,        BlueLight_EnumInstanceNames, BlueLight_EnumInstances,
-    BlueLight_GetInstance,    BlueLight_CreateInstance,    BlueLight_ModifyInstance,
-    BlueLight_DeleteInstance, BlueLight_ExecQuery,
-};
+CMPIInstanceMIFT instMIFT__ =
+    instanceMIFunctions("instanceBlueLightProfileProvider", BlueLight_EnumInstanceNames,
+                        BlueLight_EnumInstances, BlueLight_GetInstance);
 
 }  // namespace
 }  // namespace BlueLightProvider

@@ -164,6 +164,23 @@ TEST(TraceEmission, MacroPassesTheCallersNameAndLine) {
                                      std::to_string(line) + "],Parameters List:  x=2");
 }
 
+// A helper that writes the entry line of the function calling it names that function and line.
+void traceOnBehalfOf(const Kesta::TraceSite& site) {
+  auto parameters = [](VNLog::VNMessageBuffer& list) { list << " y=3"; };
+  Kesta::emitTracePara(site, "Site.cpp", "Varnel.Test", 3000, ENTERING, parameters);
+}
+
+TEST(TraceEmission, SiteNamesTheCallerNotTheHelper) {
+  LogCapture log;
+  const int line = __LINE__ + 1;
+  traceOnBehalfOf(KESTA_TRACE_SITE);
+  const std::string text =
+      "ENTERING: TestBody() in Site.cpp [Line: " + std::to_string(line) + "],Parameters List:  y=3";
+  const std::vector<LogLine> expected = {{"Varnel.Test", 3000, "LOG", text},
+                                         {"Varnel.Test", 3000, "TRACE", text}};
+  EXPECT_EQ(log.lines(), expected);
+}
+
 TEST(TraceEmission, NothingBelowTheThreshold) {
   LogCapture log(6000);
   int builds = 0;
