@@ -98,7 +98,6 @@ class ListWalk {
     SourceOutcome outcome;
     outcome.text = text;
     outcome.listedAs = listedAs;
-    outcome.found = true;
     std::unique_ptr<InstrumentationSource> source;
     try {
       source = makeInstrumentationSource(text, system_);
@@ -110,6 +109,7 @@ class ListWalk {
     // auto found too) would give its lights twice.
     const std::string name = source->name();
     if (const auto earlier = names_.find(name); earlier != names_.end()) {
+      outcome.state = SourceOutcome::State::Repeated;
       outcome.why = "the same source as \"" + printable(earlier->second) + "\"; read once";
       logSourceProblem(describeSource(text, origin) + " is the same source as \"" +
                        printable(earlier->second) + "\"; it is read once");
@@ -124,7 +124,7 @@ class ListWalk {
       fail(outcome, origin, error.what());
       return;
     }
-    outcome.readable = true;
+    outcome.state = SourceOutcome::State::Read;
     for (const InstrumentationNode& node : nodes) {
       if (node.type == NodeLexicon::NODE_TYPE_BLUE_LIGHT) ++outcome.lights;
     }
@@ -162,6 +162,7 @@ class ListWalk {
 
  private:
   void fail(SourceOutcome& outcome, const std::string& origin, const std::string& why) {
+    outcome.state = SourceOutcome::State::Unreadable;
     outcome.why = why;
     logSourceProblem(describeSource(outcome.text, origin) + " cannot be read: " + why);
     reading_.outcomes.push_back(std::move(outcome));
@@ -174,6 +175,20 @@ class ListWalk {
 };
 
 }  // namespace
+
+const char* toString(SourceOutcome::State state) {
+  switch (state) {
+    case SourceOutcome::State::Absent:
+      return "absent";
+    case SourceOutcome::State::Unreadable:
+      return "unreadable";
+    case SourceOutcome::State::Repeated:
+      return "repeated";
+    case SourceOutcome::State::Read:
+      return "read";
+  }
+  return "?";
+}
 
 bool isSourceList(std::string_view text) {
   return isAuto(text) || text.find(';') != std::string_view::npos;

@@ -61,13 +61,21 @@ DiscoveryRoots discoveryRoots();
 
 // One source that a walk considered, and what came of it.
 struct SourceOutcome {
-  std::string text;        // the source text, as listed or as auto made it
-  std::string listedAs;    // the list entry it came from: itself, or "auto"
-  bool found = false;      // false: auto found nothing of this kind on this machine
-  bool readable = false;   // the source could be made and read
-  std::size_t lights = 0;  // the blue lights it gave
-  std::string why;         // when it gave none: why (absent, the failure, "no light")
+  enum class State {
+    Absent,      // auto found nothing of this kind on this machine
+    Unreadable,  // the source could not be made or read; its line was logged
+    Repeated,    // another entry named the same source, which was read once
+    Read         // read; `lights` says how many blue lights it gave
+  };
+  std::string text;      // the source text, as listed or as auto made it
+  std::string listedAs;  // the list entry it came from: itself, or "auto"
+  State state = State::Absent;
+  std::size_t lights = 0;
+  std::string why;  // when it gave no light: why (what is absent, the failure, "no light")
 };
+
+// "absent", "unreadable", "repeated" or "read".
+const char* toString(SourceOutcome::State state);
 
 // Everything one walk of a list gave.
 struct SourceListReading {
@@ -76,8 +84,9 @@ struct SourceListReading {
   std::vector<std::string> notes;          // what the list itself did not allow
 };
 
-// Reads every source of a list (or auto) in order. Failures are not thrown: each one writes its
-// line (with `origin`, as the single-source line does) and gives no lights; so do the notes.
+// Reads every source of a list (or auto, or a single source) in order. Failures are not thrown:
+// each one writes its line (with `origin`, as the single-source line does) and gives no lights;
+// so do the notes.
 SourceListReading readSourceList(const SourceSetting& setting, const SourceSystem& system,
                                  const DiscoveryRoots& roots);
 

@@ -31,6 +31,7 @@ using Kesta::platform::readSourceList;
 using Kesta::platform::setConfigurationFileForTesting;
 using Kesta::platform::SourceListReading;
 using Kesta::platform::SourceOutcome;
+using State = Kesta::platform::SourceOutcome::State;
 using Kesta::platform::SourceSetting;
 using Kesta::platform::SourceSystem;
 using platform_test::FakeFileSystem;
@@ -106,6 +107,19 @@ class AnsweringBmc final : public IpmiDeviceOs {
 };
 
 // ---- The entries of a list ---------------------------------------------------------------------
+
+TEST(SourceListText, StatesHaveNames) {
+  EXPECT_STREQ(toString(State::Absent), "absent");
+  EXPECT_STREQ(toString(State::Unreadable), "unreadable");
+  EXPECT_STREQ(toString(State::Repeated), "repeated");
+  EXPECT_STREQ(toString(State::Read), "read");
+}
+
+TEST(SourceListText, ASingleSourceIsAListOfOne) {
+  const auto parsed = parseSourceList(" file:/a.json ");
+  EXPECT_EQ(parsed.entries, std::vector<std::string>{"file:/a.json"});
+  EXPECT_TRUE(parsed.notes.empty());
+}
 
 TEST(SourceListText, AutoAndTextsWithASemicolonAreLists) {
   EXPECT_TRUE(isSourceList("auto"));
@@ -191,8 +205,7 @@ TEST_F(SourceListWalk, SourcesAreReadInTheirOrder) {
   ASSERT_EQ(reading.outcomes.size(), 2u);
   EXPECT_EQ(reading.outcomes[0].text, "file:" + b);
   EXPECT_EQ(reading.outcomes[0].listedAs, "file:" + b);
-  EXPECT_TRUE(reading.outcomes[0].found);
-  EXPECT_TRUE(reading.outcomes[0].readable);
+  EXPECT_EQ(reading.outcomes[0].state, State::Read);
   EXPECT_EQ(reading.outcomes[0].lights, 1u);
   EXPECT_EQ(reading.outcomes[1].lights, 1u);
   EXPECT_TRUE(log_.lines(kCategory).empty());
@@ -214,11 +227,11 @@ TEST_F(SourceListWalk, AFailingSourceWritesItsLineAndTheOthersStillGiveTheirs) {
                   "cannot be read: unknown kind of source (expected file:<path>, "
                   "sysfs:<directory>, ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)")}));
   ASSERT_EQ(reading.outcomes.size(), 3u);
-  EXPECT_FALSE(reading.outcomes[0].readable);
+  EXPECT_EQ(reading.outcomes[0].state, State::Unreadable);
   EXPECT_EQ(reading.outcomes[0].why, "No such file or directory");
   EXPECT_EQ(reading.outcomes[0].lights, 0u);
-  EXPECT_FALSE(reading.outcomes[1].readable);
-  EXPECT_TRUE(reading.outcomes[2].readable);
+  EXPECT_EQ(reading.outcomes[1].state, State::Unreadable);
+  EXPECT_EQ(reading.outcomes[2].state, State::Read);
 }
 
 TEST_F(SourceListWalk, EveryFailingSourceGivesAnEmptyWalkNotAFailure) {
@@ -249,6 +262,7 @@ TEST_F(SourceListWalk, TwoNamesForOneSourceReadItOnce) {
       read("sysfs:" + leds + ";sysfs:" + leds + "?lights=blue-or-identify");
   EXPECT_EQ(pathsOf(reading.nodes), std::vector<std::string>{"x::identify"});
   ASSERT_EQ(reading.outcomes.size(), 2u);
+  EXPECT_EQ(reading.outcomes[1].state, State::Repeated);
   EXPECT_EQ(reading.outcomes[1].why, "the same source as \"sysfs:" + leds + "\"; read once");
   EXPECT_EQ(log_.lines(kCategory),
             std::vector<LogLine>{failure("Instrumentation source \"sysfs:" + leds +
@@ -343,7 +357,7 @@ TEST_F(AutoSources, AMachineWithoutAnyGivesNoLightAndNoLine) {
   EXPECT_TRUE(log_.lines(kCategory).empty());
   ASSERT_EQ(reading.outcomes.size(), 3u);
   for (const SourceOutcome& outcome : reading.outcomes) {
-    EXPECT_FALSE(outcome.found) << outcome.text;
+    EXPECT_EQ(outcome.state, State::Absent) << outcome.text;
     EXPECT_EQ(outcome.listedAs, "auto");
   }
   EXPECT_EQ(reading.outcomes[0].text, "ipmi:");
@@ -369,7 +383,7 @@ TEST_F(AutoSources, TheBmcAndTheIdentifyLedsAreFound) {
   ASSERT_EQ(reading.outcomes.size(), 3u);
   EXPECT_EQ(reading.outcomes[0].text, "ipmi:/dev/ipmi/0");
   EXPECT_EQ(reading.outcomes[0].lights, 1u);
-  EXPECT_FALSE(reading.outcomes[1].found);
+  EXPECT_EQ(reading.outcomes[1].state, State::Absent);
   EXPECT_EQ(reading.outcomes[2].text, "sysfs:/sys/class/leds?lights=identify");
   EXPECT_EQ(reading.outcomes[2].lights, 1u);
   EXPECT_TRUE(log_.lines(kCategory).empty());
@@ -392,8 +406,7 @@ TEST_F(AutoSources, APresentSourceThatCannotBeReadWritesItsLine) {
             std::vector<LogLine>{failure(
                 "Instrumentation source \"sysfs:/sys/class/leds?lights=identify\" (from auto, "
                 "default) cannot be read: Permission denied")});
-  EXPECT_TRUE(reading.outcomes[2].found);
-  EXPECT_FALSE(reading.outcomes[2].readable);
+  EXPECT_EQ(reading.outcomes[2].state, State::Unreadable);
   EXPECT_EQ(reading.outcomes[2].why, "Permission denied");
 }
 
@@ -401,8 +414,7 @@ TEST_F(AutoSources, AnLedClassWithoutIdentifyLedsIsFoundAndGivesNothing) {
   addLed("input3::capslock", "0");
   const SourceListReading reading = readAuto();
   EXPECT_TRUE(reading.nodes.empty());
-  EXPECT_TRUE(reading.outcomes[2].found);
-  EXPECT_TRUE(reading.outcomes[2].readable);
+  EXPECT_EQ(reading.outcomes[2].state, State::Read);
   EXPECT_EQ(reading.outcomes[2].why, "no light");
   EXPECT_TRUE(log_.lines(kCategory).empty());
 }
