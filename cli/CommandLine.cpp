@@ -152,6 +152,23 @@ void checkComputerSystems(const CommandLine& line) {
   }
 }
 
+// discover takes no argument and only the options that say how to show what it finds.
+void checkDiscover(const CommandLine& line, const std::vector<std::string>& positional) {
+  if (positional.size() > 1) throw UsageError("unexpected argument " + quote(positional[1]));
+  auto refuse = [](const char* option) {
+    throw UsageError(std::string(option) + " does not apply to discover");
+  };
+  if (line.nameSpace != kDefaultNamespace) refuse("--namespace");
+  if (line.properties) refuse("--properties");
+  if (line.assocClass) refuse("--assoc-class");
+  if (line.resultClass) refuse("--result-class");
+  if (line.role) refuse("--role");
+  if (line.resultRole) refuse("--result-role");
+  if (!line.computerSystems.empty()) refuse("--computer-system");
+  if (line.noComputerSystem) refuse("--no-computer-system");
+  if (line.upcallFailure) refuse("--upcall-failure");
+}
+
 }  // namespace
 
 std::vector<std::string> parsePropertyList(const std::string& text) {
@@ -230,12 +247,17 @@ CommandLine parseCommandLine(const std::vector<std::string>& arguments) {
   }
 
   if (positional.empty()) {
-    throw UsageError("no operation given (ei, ein, gi, ai, ain, ri or rin)");
+    throw UsageError("no operation given (discover, ei, ein, gi, ai, ain, ri or rin)");
+  }
+  if (Kesta::platform::equalsIgnoringCase(positional[0], "discover")) {
+    checkDiscover(line, positional);
+    line.action = CommandLine::Action::Discover;
+    return line;
   }
   const OperationInfo* info = findOperation(positional[0]);
   if (info == nullptr) {
     throw UsageError("unknown operation " + quote(positional[0]) +
-                     "; the operations are ei, ein, gi, ai, ain, ri and rin");
+                     "; the operations are discover, ei, ein, gi, ai, ain, ri and rin");
   }
   line.operation = info->operation;
   if (positional.size() < 2) {

@@ -16,7 +16,8 @@ inline constexpr const char* kProgramName = "bluelight-cli";
 inline constexpr const char* kDefaultNamespace = "root/cimv2";
 
 struct CommandLine {
-  enum class Action { Run, Help, Version };
+  /// Run: one CIM operation; Discover: the sources and the lights (`discover`).
+  enum class Action { Run, Discover, Help, Version };
   Action action = Action::Run;
 
   Operation operation = Operation::EnumerateInstances;

@@ -8,7 +8,8 @@
 namespace bluelight::cli {
 
 /// A remark on the value of KESTA_INSTRUMENTATION (null when unset): a file: source whose file
-/// cannot be read. nullopt when there is nothing to say.
+/// cannot be read, alone or as the first such entry of a list. nullopt when there is nothing to
+/// say.
 std::optional<std::string> instrumentationRemark(const char* setting);
 
 }  // namespace bluelight::cli

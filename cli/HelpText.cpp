@@ -14,6 +14,7 @@ constexpr std::string_view kHelp =
 object manager
 
 Usage: bluelight-cli [options] <operation> <CLASS | PATH>
+       bluelight-cli [--json] [--library PATH] discover
 
 The tool loads the blue-light provider library into an in-process CMPI host and sends it the
 CIM read operations a WBEM client would send through an object manager. The lights come from
@@ -37,6 +38,12 @@ Classes served by the library:
                                       (PartComponent)
   KESTA_ComputerSystem is not served here: the tool itself answers the provider's up-calls
   for it (see --computer-system).
+
+Start here:
+  discover                              which sources of lights this server has (with the
+                                        configured list, or what auto finds), how many lights
+                                        each gave and why not when none, then every light
+         bluelight-cli discover
 
 Operations:
   ein, enumerate-instance-names CLASS   the object paths of every instance of a class
@@ -88,9 +95,11 @@ Options:
   --version               the version of the tool
 
 Environment (read by the provider library; KESTA_SYSTEM_NAME also by the tool):
-  KESTA_INSTRUMENTATION   where the lights come from: file:<tree.json> (a JSON snapshot, see
-                          examples/README.md) or sysfs:<directory>; when unset, the first line
-                          of /etc/kesta/instrumentation.conf, else sysfs:/sys/class/leds
+  KESTA_INSTRUMENTATION   where the lights come from: auto, file:<tree.json> (a JSON
+                          snapshot, see examples/README.md), sysfs:<directory>, ipmi:[<device>],
+                          enclosure:[<directory>], ... or several separated by ';'; when unset,
+                          the first line of /etc/kesta/instrumentation.conf, else auto
+  KESTA_DISCOVERY_ROOT    a folder that auto puts in front of /dev and /sys (to look at a copy)
   KESTA_SYSTEM_NAME       the system name in the SystemName keys and host names of the paths
                           (default: this host's fully qualified name)
   VNLOG_SINK              where the provider's log goes: file:<path>, stderr, syslog or none

@@ -5,9 +5,11 @@
 #include <optional>
 
 #include "CommandLine.h"
+#include "Discover.h"
 #include "Dispatch.h"
 #include "EnvironmentCheck.h"
 #include "HelpText.h"
+#include "JsonFormat.h"
 #include "KestaCommonBase.h"
 #include "LibraryLocation.h"
 #include "Output.h"
@@ -86,6 +88,40 @@ int run(const CommandLine& line, const ToolIo& io) {
   return report.status.ok() ? kExitOk : kExitFailed;
 }
 
+// The sources, read here as the provider reads them, then the lights as the provider publishes
+// them: an EnumerateInstances of KESTA_BlueLight with the properties that say what each light is.
+int discover(const CommandLine& line, const ToolIo& io) {
+  const DiscoveredSources sources = discoverSources();
+  if (!line.json) io.out << sourcesText(sources) << "\n";
+
+  CommandLine enumerate = line;
+  enumerate.action = CommandLine::Action::Run;
+  enumerate.operation = Operation::EnumerateInstances;
+  enumerate.argument = "KESTA_BlueLight";
+  enumerate.properties = discoveredProperties();
+  const Plan plan = planOperation(enumerate);
+  const std::optional<std::string> library = libraryToLoad(line, io);
+  if (!library) return kExitNotLoaded;
+  ProviderSession session(*library, computerSystems(enumerate));
+  if (line.verbose) describeSetup(session, computerSystems(enumerate), io.err);
+  prepare(plan, session);
+  const Report report = execute(plan, session, line.verbose ? &io.err : nullptr);
+
+  if (line.json) {
+    Json json = jsonSources(sources);
+    Json lights = Json::array();
+    for (const cmpihost::InstanceValue& light : report.instances)
+      lights.push_back(jsonInstance(light));
+    json["lights"] = lights;
+    json["status"] = jsonStatus(report.status);
+    io.out << json.dump(2) << "\n";
+  } else {
+    io.out << lightsText(report.instances);
+  }
+  writeStatus(report, line.verbose, io.err);
+  return report.status.ok() ? kExitOk : kExitFailed;
+}
+
 }  // namespace
 
 int runTool(const std::vector<std::string>& arguments, const ToolIo& io) {
@@ -100,6 +136,8 @@ int runTool(const std::vector<std::string>& arguments, const ToolIo& io) {
         return kExitOk;
       case CommandLine::Action::Run:
         return run(line, io);
+      case CommandLine::Action::Discover:
+        return discover(line, io);
     }
   } catch (const UsageError& error) {
     sayError(io.err, error.what());

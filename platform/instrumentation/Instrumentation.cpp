@@ -5,31 +5,18 @@
 #include <string>
 
 #include "KestaInstrumentation.h"
-#include "VNLog.h"
 #include "instrumentation/InstrumentationSource.h"
-#include "text/Text.h"
+#include "instrumentation/SourceList.h"
+#include "instrumentation/SourceLog.h"
 
 namespace Kesta {
 
 namespace {
 
-// Never "Varnel.": those categories are the module's.
-constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
-constexpr int kFailureLevel = 6000;
-
 // Writes the one log line about an unusable source and throws the same text.
 [[noreturn]] void reportUnusable(const std::string& text) {
-  VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,
-                                   0, 0, text);
+  platform::logSourceProblem(text);
   throw std::runtime_error(text);
-}
-
-std::string describe(const std::string& sourceText, const std::string& origin) {
-  std::string text = "Instrumentation source \"" + platform::printable(sourceText) + "\"";
-  if (!origin.empty()) {
-    text += " (from " + platform::printable(origin) + ")";
-  }
-  return text;
 }
 
 std::vector<platform::InstrumentationNode> readAll(const platform::InstrumentationSource& source,
@@ -39,7 +26,8 @@ std::vector<platform::InstrumentationNode> readAll(const platform::Instrumentati
   } catch (const std::exception& error) {
     // Any failure, SourceError or not (memory, a parser surprise), ends up as the one line and
     // the one exception the caller expects.
-    reportUnusable(describe(source.name(), origin) + " cannot be read: " + error.what());
+    reportUnusable(platform::describeSource(source.name(), origin) +
+                   " cannot be read: " + error.what());
   }
 }
 
@@ -52,11 +40,18 @@ Instrumentation::Instrumentation() {
   } catch (const std::exception& error) {
     reportUnusable(std::string("Instrumentation configuration cannot be used: ") + error.what());
   }
+  // A list, or auto, reads every source it can and logs the others; it does not fail.
+  if (platform::isSourceList(setting.text)) {
+    nodes_ = platform::readSourceList(setting, platform::SourceSystem{}, platform::discoveryRoots())
+                 .nodes;
+    return;
+  }
   std::unique_ptr<platform::InstrumentationSource> source;
   try {
     source = platform::makeInstrumentationSource(setting.text);
   } catch (const std::exception& error) {
-    reportUnusable(describe(setting.text, setting.origin) + " cannot be read: " + error.what());
+    reportUnusable(platform::describeSource(setting.text, setting.origin) +
+                   " cannot be read: " + error.what());
   }
   nodes_ = readAll(*source, setting.origin);
 }

@@ -41,7 +41,8 @@ std::optional<unsigned int> InstrumentationNode::property(unsigned int number) c
   return std::nullopt;
 }
 
-std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text) {
+std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text,
+                                                                 const SourceSystem& system) {
   const std::string_view::size_type colon = text.find(':');
   const std::string_view scheme = text.substr(0, colon);
   const std::string_view rest =
@@ -50,18 +51,21 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
     if (rest.empty()) {
       throw SourceError("no file is named after \"file:\"");
     }
-    return std::make_unique<JsonFileSource>(std::string(rest));
+    return std::make_unique<JsonFileSource>(std::string(rest), system.files);
   }
   if (colon != std::string_view::npos && scheme == "sysfs") {
-    return std::make_unique<SysfsLedSource>(rest.empty() ? std::string(kDefaultSysfsLedDirectory)
-                                                         : std::string(rest));
+    return makeSysfsLedSource(rest, system.files);
   }
   if (colon != std::string_view::npos && (scheme == "ipmi" || scheme == "ipmi-lan")) {
-    return makeIpmiSource(text);
+    return makeIpmiSource(text, IpmiSourceSystem{system.clock, system.files, system.ipmiDevice});
   }
   throw SourceError(
       "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
       "ipmi-lan:<host>?credentials=<file>)");
+}
+
+std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text) {
+  return makeInstrumentationSource(text, SourceSystem{});
 }
 
 SourceSetting configuredSource(FileSystem& files) {

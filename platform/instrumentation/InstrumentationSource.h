@@ -12,10 +12,14 @@
 #include <vector>
 
 #include "instrumentation/SourceError.h"
+#include "os/Clock.h"
 #include "os/FileSystem.h"
 
 namespace Kesta {
 namespace platform {
+
+class IpmiDeviceOs;
+std::shared_ptr<IpmiDeviceOs> systemIpmiDeviceOs();
 
 // One numeric property of a node.
 struct NodeProperty {
@@ -57,8 +61,19 @@ class InstrumentationSource {
   virtual std::vector<InstrumentationNode> readNodes() const = 0;
 };
 
-// The source that a source text names: "file:<path>" or "sysfs:<dir>" ("sysfs:" alone is
-// /sys/class/leds). Throws SourceError for any other text.
+// What the sources use of the operating system: the file system, the clock their deadlines are
+// measured by, and the IPMI device's system calls. The real ones unless a test hands in its own.
+struct SourceSystem {
+  std::shared_ptr<FileSystem> files = systemFileSystem();
+  std::shared_ptr<const Clock> clock = steadyClock();
+  std::shared_ptr<IpmiDeviceOs> ipmiDevice = systemIpmiDeviceOs();
+};
+
+// The one source that a source text names: "file:<path>", "sysfs:[<dir>]", "ipmi:[<device>]" or
+// "ipmi-lan:<host>?credentials=<file>" (lists and "auto" are SourceList.h's). Throws SourceError
+// for any other text.
+std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text,
+                                                                 const SourceSystem& system);
 std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text);
 
 // The configured source text and where it came from (for the log line when it fails).
@@ -67,7 +82,8 @@ struct SourceSetting {
   std::string origin;  // "KESTA_INSTRUMENTATION", the configuration file's path, or "default"
 };
 
-constexpr const char* kDefaultSourceText = "sysfs:/sys/class/leds";
+// With nothing configured the platform finds the lights itself (SourceList.h).
+constexpr const char* kDefaultSourceText = "auto";
 constexpr const char* kDefaultConfigurationFile = "/etc/kesta/instrumentation.conf";
 
 // KESTA_INSTRUMENTATION when set and not blank, else the first line of the configuration file

@@ -39,8 +39,14 @@ class BlackboxTest : public ::testing::Test {
   BlackboxTest();
   ~BlackboxTest() override;
 
-  // Points the instrumentation at a tree of `nodes` (read at every operation).
+  // Points the instrumentation at a tree of `nodes` (read at every operation), followed by the
+  // other sources of the run, if any.
   void useTree(const std::vector<testsupport::Node>& nodes);
+  // The sources the run reads after the tree, from BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILE (one
+  // line, ";"-separated), with a leading ";"; empty in the ordinary run.
+  static std::string otherSources();
+  // True in the run with other sources.
+  static bool withOtherSources();
   // Answers the KESTA_ComputerSystem up-calls with computer systems of these names.
   void useComputerSystems(const std::vector<std::string>& names);
 

@@ -196,13 +196,40 @@ TEST(CommandLine, UpcallFailureByNameOrNumber) {
 }
 
 TEST(CommandLine, OperationAndArgumentErrors) {
-  EXPECT_EQ(usageError({}), "no operation given (ei, ein, gi, ai, ain, ri or rin)");
-  EXPECT_EQ(usageError({"--json"}), "no operation given (ei, ein, gi, ai, ain, ri or rin)");
+  EXPECT_EQ(usageError({}), "no operation given (discover, ei, ein, gi, ai, ain, ri or rin)");
+  EXPECT_EQ(usageError({"--json"}),
+            "no operation given (discover, ei, ein, gi, ai, ain, ri or rin)");
   EXPECT_EQ(usageError({"list", "X"}),
-            "unknown operation \"list\"; the operations are ei, ein, gi, ai, ain, ri and rin");
+            "unknown operation \"list\"; the operations are discover, ei, ein, gi, ai, ain, ri and "
+            "rin");
   EXPECT_EQ(usageError({"ei"}), "enumerate-instances needs a class name");
   EXPECT_EQ(usageError({"gi"}), "get-instance needs an object path");
   EXPECT_EQ(usageError({"ei", "A", "B"}), "unexpected argument \"B\"");
+}
+
+TEST(CommandLine, DiscoverTakesNoArgumentAndOnlyTheOptionsOfShowing) {
+  for (const auto& arguments :
+       std::vector<std::vector<std::string>>{{"discover"},
+                                             {"DISCOVER"},
+                                             {"--json", "discover"},
+                                             {"discover", "--verbose"},
+                                             {"discover", "--library", "/x/lib.so"}}) {
+    const CommandLine line = parseCommandLine(arguments);
+    EXPECT_EQ(line.action, CommandLine::Action::Discover);
+  }
+  EXPECT_TRUE(parseCommandLine({"discover", "--json"}).json);
+  EXPECT_EQ(parseCommandLine({"discover", "--library=/x/lib.so"}).library, "/x/lib.so");
+  EXPECT_EQ(usageError({"discover", "KESTA_BlueLight"}), "unexpected argument \"KESTA_BlueLight\"");
+  EXPECT_EQ(usageError({"discover", "--properties", "A"}),
+            "--properties does not apply to discover");
+  EXPECT_EQ(usageError({"discover", "--namespace", "root/x"}),
+            "--namespace does not apply to discover");
+  EXPECT_EQ(usageError({"discover", "--assoc-class", "A"}),
+            "--assoc-class does not apply to discover");
+  EXPECT_EQ(usageError({"discover", "--computer-system", "a"}),
+            "--computer-system does not apply to discover");
+  EXPECT_EQ(usageError({"discover", "--upcall-failure", "2"}),
+            "--upcall-failure does not apply to discover");
 }
 
 TEST(CommandLine, OptionErrors) {

@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "TestSupport.h"
 #include "ToolProcess.h"
 
 namespace {
@@ -571,6 +572,96 @@ TEST_F(CliEndToEnd, SampleTreeStates) {
                         {"Drawer Blue Light:4.1", "10 [3] 3"},
                         {"Service Blue Light:5.1", "0 [] 0"},
                     }));
+}
+
+// ---- discover ------------------------------------------------------------------------------
+
+class CliDiscover : public ::testing::Test {
+ protected:
+  ProcessResult discover(const std::string& sources, std::vector<std::string> arguments = {}) {
+    arguments.insert(arguments.begin(), {"--library", kLibrary, "discover"});
+    return clitest::runProcess(kTool, arguments,
+                               {{"KESTA_INSTRUMENTATION", sources},
+                                {"KESTA_DISCOVERY_ROOT", root_.path()},
+                                {"KESTA_SYSTEM_NAME", "testhost"},
+                                {"VNLOG_SINK", "none"}});
+  }
+  void identifyLed(const std::string& name, const std::string& brightness) {
+    const std::string folder = root_.file("sys/class/leds/" + name);
+    std::filesystem::create_directories(folder);
+    testsupport::writeFile(folder + "/brightness", brightness + "\n");
+  }
+
+  testsupport::TempDir root_;
+};
+
+TEST_F(CliDiscover, AListTellsWhatEachSourceGaveThenTheLights) {
+  const std::string missing = root_.file("missing.json");
+  const ProcessResult result = discover("file:" + kTwoLights + "; file:" + missing + ";;");
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  EXPECT_EQ(result.out, "sources: file:" + kTwoLights + "; file:" + missing +
+                            ";; (from KESTA_INSTRUMENTATION)\n"
+                            "  read       2 lights   file:" +
+                            kTwoLights +
+                            "\n"
+                            "  unreadable -          file:" +
+                            missing +
+                            "  (No such file or directory)\n"
+                            "  note: the list has 2 empty entries (entries 3, 4); left out\n"
+                            "\n"
+                            "lights: 2\n"
+                            "  AlarmState      HealthState   DeviceID\n"
+                            "  2 steady        5 OK          Blue Light:1.2\n"
+                            "  3 alternating   10 degraded   Rear Blue Light:3.1\n");
+  EXPECT_EQ(result.err, kOk);
+}
+
+TEST_F(CliDiscover, AutoOnAMachineWithNothingFindsNothingAndSaysWhy) {
+  const ProcessResult result = discover("auto");
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  const std::string r = root_.path();
+  EXPECT_EQ(result.out,
+            "sources: auto (from KESTA_INSTRUMENTATION)\n"
+            "  absent     -          ipmi:  (no IPMI device (looked for " +
+                r + "/dev/ipmi0, " + r + "/dev/ipmi/0, " + r +
+                "/dev/ipmidev/0))\n"
+                "  absent     -          enclosure:  (no " +
+                r +
+                "/sys/class/enclosure)\n"
+                "  absent     -          sysfs:?lights=identify  (no " +
+                r + "/sys/class/leds)\n\nlights: 0\n");
+  EXPECT_EQ(result.err, kOk);
+}
+
+TEST_F(CliDiscover, AutoFindsTheIdentifyLeds) {
+  identifyLed("platform::uid", "1");
+  identifyLed("platform:blue:power", "1");
+  const ProcessResult result = discover("auto");
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  EXPECT_TRUE(contains(result.out, "  read       1 light    sysfs:" + root_.path() +
+                                       "/sys/class/leds?lights=identify\n"))
+      << result.out;
+  EXPECT_TRUE(contains(result.out,
+                       "lights: 1\n  AlarmState      HealthState   DeviceID\n"
+                       "  2 steady        5 OK          Blue Light:platform::uid\n"))
+      << result.out;
+}
+
+TEST_F(CliDiscover, AsJson) {
+  identifyLed("x::locate", "0");
+  const ProcessResult result = discover("auto", {"--json"});
+  EXPECT_EQ(result.exitCode, 0) << result.err;
+  const Json json = Json::parse(result.out);
+  EXPECT_EQ(json["setting"]["text"], "auto");
+  EXPECT_EQ(json["setting"]["origin"], "KESTA_INSTRUMENTATION");
+  ASSERT_EQ(json["sources"].size(), 3u);
+  EXPECT_EQ(json["sources"][2]["state"], "read");
+  EXPECT_EQ(json["sources"][2]["lights"], 1);
+  ASSERT_EQ(json["lights"].size(), 1u);
+  EXPECT_EQ(json["lights"][0]["properties"]["DeviceID"], "Blue Light:x::locate");
+  EXPECT_EQ(json["lights"][0]["properties"]["AlarmState"], 1);
+  EXPECT_EQ(json["status"]["name"], "CMPI_RC_OK");
+  EXPECT_EQ(result.err, kOk);
 }
 
 }  // namespace

@@ -29,5 +29,17 @@ TEST(EnvironmentCheck, UnreadableFile) {
             "lights (VNLOG_SINK=stderr shows its log)");
 }
 
+TEST(EnvironmentCheck, AListIsCheckedEntryByEntry) {
+  const std::string file = ::testing::TempDir() + "bluelight-cli-environment-list.json";
+  std::ofstream(file) << "{\"nodes\": []}";
+  EXPECT_FALSE(instrumentationRemark(("file:" + file + ";sysfs:/x;auto").c_str()).has_value());
+  EXPECT_FALSE(instrumentationRemark("auto").has_value());
+  EXPECT_EQ(
+      instrumentationRemark(("file:" + file + "; file:/nonexistent/b.json ;file:/c").c_str()),
+      "KESTA_INSTRUMENTATION lists file:/nonexistent/b.json, which cannot be read: its lights "
+      "are missing (bluelight-cli discover tells what each source gave)");
+  std::remove(file.c_str());
+}
+
 }  // namespace
 }  // namespace bluelight::cli

@@ -29,6 +29,8 @@ TEST(Tool, HelpNamesEveryOperationOptionVariableAndExitCode) {
   EXPECT_EQ(run.exitCode, 0);
   EXPECT_EQ(run.err, "");
   for (const char* text : {"Usage: bluelight-cli [options] <operation>",
+                           "bluelight-cli [--json] [--library PATH] discover",
+                           "  discover  ",
                            "ein, enumerate-instance-names",
                            "ei,  enumerate-instances",
                            "gi,  get-instance",
@@ -51,6 +53,7 @@ TEST(Tool, HelpNamesEveryOperationOptionVariableAndExitCode) {
                            "--help",
                            "--version",
                            "KESTA_INSTRUMENTATION",
+                           "KESTA_DISCOVERY_ROOT",
                            "KESTA_SYSTEM_NAME",
                            "VNLOG_SINK",
                            "VNLOG_LEVEL",

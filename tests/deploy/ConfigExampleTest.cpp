@@ -9,6 +9,7 @@
 #include "DeployFiles.h"
 #include "TestSupport.h"
 #include "instrumentation/InstrumentationSource.h"
+#include "instrumentation/SourceList.h"
 
 namespace {
 
@@ -27,8 +28,8 @@ class ConfigExampleTest : public ::testing::Test {
 TEST_F(ConfigExampleTest, ThePlatformReadsTheFirstLineAsTheSource) {
   const platform::SourceSetting setting = platform::configuredSource();
   EXPECT_EQ(setting.origin, BLUELIGHT_DEPLOY_CONFIG_EXAMPLE);
-  EXPECT_EQ(setting.text, "sysfs:/sys/class/leds");
-  EXPECT_NO_THROW(platform::makeInstrumentationSource(setting.text));
+  EXPECT_EQ(setting.text, "auto");
+  EXPECT_TRUE(platform::isSourceList(setting.text));
 }
 
 TEST_F(ConfigExampleTest, InstallingItChangesNothing) {

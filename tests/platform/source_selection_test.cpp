@@ -83,7 +83,7 @@ TEST_F(SourceSelection, ConfigurationFileWhenTheVariableIsUnsetOrEmpty) {
 TEST_F(SourceSelection, DefaultWithoutVariableOrFile) {
   ScopedEnv source("KESTA_INSTRUMENTATION", std::nullopt);
   const Kesta::platform::SourceSetting setting = configuredSource();
-  EXPECT_EQ(setting.text, "sysfs:/sys/class/leds");
+  EXPECT_EQ(setting.text, "auto");
   EXPECT_EQ(setting.origin, "default");
 }
 
@@ -164,7 +164,7 @@ TEST_F(SourceSelection, AConfigurationFileThatIsNotThereMeansTheDefault) {
   files.addFile(configFile(), "file:/tree.json\n");
   EXPECT_EQ(configuredSource(files).text, "file:/tree.json");
   files.fail(FakeFileSystem::Call::Open, configFile(), ENOENT);
-  EXPECT_EQ(configuredSource(files).text, "sysfs:/sys/class/leds");
+  EXPECT_EQ(configuredSource(files).text, "auto");
 }
 
 TEST_F(SourceSelection, BlankFirstLineIsLoggedAndThrown) {

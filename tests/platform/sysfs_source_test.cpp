@@ -19,10 +19,13 @@ using Kesta::Instrumentation;
 using Kesta::NodeLexicon;
 using Kesta::platform::InstrumentationNode;
 using Kesta::platform::isBlueLight;
+using Kesta::platform::isIdentifyLed;
 using Kesta::platform::ledAlarmState;
+using Kesta::platform::makeSysfsLedSource;
 using Kesta::platform::SourceError;
 using Kesta::platform::splitLedName;
 using Kesta::platform::SysfsLedSource;
+using Kesta::platform::systemFileSystem;
 using platform_test::FakeFileSystem;
 using platform_test::writeFileIn;
 using testsupport::LogCapture;
@@ -334,6 +337,56 @@ TEST(SysfsSource, AlarmStateRules) {
 
 TEST(SysfsSource, NameOfTheSource) {
   EXPECT_EQ(SysfsLedSource("/sys/class/leds").name(), "sysfs:/sys/class/leds");
+}
+
+// ---- Which LEDs: lights=identify ----------------------------------------------------------------
+
+TEST(SysfsSource, IdentifyLedsAreTheIdentificationHalfOfTheRule) {
+  EXPECT_TRUE(isIdentifyLed(splitLedName("platform::identify")));
+  EXPECT_TRUE(isIdentifyLed(splitLedName("0000:03:00.0:enclosure:locate")));
+  EXPECT_TRUE(isIdentifyLed(splitLedName("uid")));
+  EXPECT_TRUE(isIdentifyLed(splitLedName("x:blue:chassis_locate")));
+  EXPECT_FALSE(isIdentifyLed(splitLedName("x:blue:status")));
+  EXPECT_FALSE(isIdentifyLed(splitLedName("input3::capslock")));
+  EXPECT_TRUE(isBlueLight(splitLedName("x:blue:status")));
+}
+
+TEST(SysfsSource, OnlyIdentifyLedsWithLightsIdentify) {
+  TempDir tree;
+  addLed(tree, "a:blue:status", "[none]", "1");
+  addLed(tree, "b::locate", "[none]", "0");
+  addLed(tree, "c::capslock", "[none]", "1");
+  const auto identify = makeSysfsLedSource(tree.path() + "?lights=identify", systemFileSystem());
+  EXPECT_EQ(identify->name(), "sysfs:" + tree.path() + "?lights=identify");
+  const auto nodes = identify->readNodes();
+  ASSERT_EQ(nodes.size(), 1u);
+  EXPECT_EQ(nodes[0].path, "b::locate");
+  const auto both =
+      makeSysfsLedSource(tree.path() + "?lights=Blue-Or-Identify", systemFileSystem());
+  EXPECT_EQ(both->name(), "sysfs:" + tree.path());
+  EXPECT_EQ(both->readNodes().size(), 2u);
+}
+
+TEST(SysfsSource, TheDefaultFolderWithOptions) {
+  EXPECT_EQ(makeSysfsLedSource("?lights=identify", systemFileSystem())->name(),
+            "sysfs:/sys/class/leds?lights=identify");
+  EXPECT_EQ(makeSysfsLedSource("", systemFileSystem())->name(), "sysfs:/sys/class/leds");
+}
+
+TEST(SysfsSource, UnknownOptionsAndValuesAreRefused) {
+  const auto refusal = [](const std::string& rest) {
+    try {
+      makeSysfsLedSource(rest, systemFileSystem());
+    } catch (const SourceError& error) {
+      return std::string(error.what());
+    }
+    return std::string("no refusal");
+  };
+  EXPECT_EQ(refusal("/x?lights=all"),
+            "lights=all must be lights=identify or lights=blue-or-identify");
+  EXPECT_EQ(refusal("/x?colour=blue"), "unknown option \"colour\" (expected lights)");
+  EXPECT_EQ(refusal("/x?lights"), "the options after '?' must be name=value pairs joined by '&'");
+  EXPECT_EQ(refusal("/x?lights=identify&lights=identify"), "the option \"lights\" is given twice");
 }
 
 }  // namespace

@@ -620,6 +620,52 @@ INSTANTIATE_TEST_SUITE_P(Lights, TreeSizeTest, ::testing::Values(0u, 1u, 65535u,
                            return "Lights" + std::to_string(info.param);
                          });
 
+// ---- Source lists ------------------------------------------------------------------------------
+
+// Lists of sources as a careless configuration writes them: every operation still answers with
+// the lights of the sources that can be read, the list's own problems cost one line each, and
+// nothing crashes however long or odd the list.
+TEST_F(HostileInputTest, HostileSourceListsStillGiveTheTreesLights) {
+  const std::string tree = "file:" + tree_;
+  std::string thousand;
+  for (int i = 0; i < 1000; ++i) thousand += ";file:" + dir_.file("missing-" + std::to_string(i));
+  struct Case {
+    std::string name;
+    std::string list;
+    std::size_t lights;
+    std::size_t lines;  // lines of the instrumentation's category per operation
+  };
+  const std::vector<Case> cases = {
+      {"the tree and a thousand missing files", tree + thousand, 3, 1 + 63},
+      {"nothing but semicolons", std::string(500, ';'), 0, 1},
+      {"the tree between empty entries", ";;" + tree + ";;", 3, 1},
+      {"the tree three times", tree + ";" + tree + " ; " + tree, 3, 1},
+      {"an entry of ten thousand characters", tree + ";file:/" + std::string(10000, 'x'), 3, 1},
+      {"control characters and invalid UTF-8", tree + ";file:/a\x01\xff\n;bogus\t:", 3, 2},
+      {"auto twice with nothing to find", "auto;auto;" + tree, 3, 1}};
+  testsupport::ScopedEnv root("KESTA_DISCOVERY_ROOT", dir_.file("empty-machine"));
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.name);
+    testsupport::ScopedEnv source("KESTA_INSTRUMENTATION", c.list);
+    clearLog();
+    const Outcome names =
+        cmpihost::enumerateInstanceNames(broker_, light_, classPath("KESTA_BlueLight"));
+    expectSane(names);
+    EXPECT_EQ(names.paths().size(), c.lights);
+    std::size_t lines = 0;
+    for (const testsupport::LogLine& line : logLines()) {
+      if (line.category != "Kesta.Platform.Instrumentation") continue;
+      ++lines;
+      EXPECT_EQ(line.text.find('\n'), std::string::npos) << line.text;
+    }
+    EXPECT_EQ(lines, c.lines);
+    const Outcome instances =
+        cmpihost::enumerateInstances(broker_, light_, classPath("KESTA_BlueLight"));
+    expectSane(instances);
+    EXPECT_EQ(instances.instances().size(), c.lights);
+  }
+}
+
 // ---- Descriptions ------------------------------------------------------------------------------
 
 TEST_F(HostileInputTest, AnEmptyDescriptionEndsTheWalkAndFilesNothing) {

@@ -5,9 +5,12 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <map>
+#include <memory>
 
 #include "KestaCommonBase.h"
 #include "KestaInstrumentation.h"
+#include "instrumentation/SourceOptions.h"
 #include "os/FileIo.h"
 #include "text/Text.h"
 
@@ -96,9 +99,10 @@ LedName splitLedName(std::string_view name) {
 }
 
 bool isBlueLight(const LedName& name) {
-  if (equalsIgnoringCase(name.colour, "blue")) {
-    return true;
-  }
+  return equalsIgnoringCase(name.colour, "blue") || isIdentifyLed(name);
+}
+
+bool isIdentifyLed(const LedName& name) {
   const std::string function = asciiLowerCopy(name.function);
   std::string_view rest = function;
   while (!rest.empty()) {
@@ -151,7 +155,8 @@ std::vector<InstrumentationNode> SysfsLedSource::readNodes() const {
     if (files_->statAt(classFd, name, info) != 0 || !S_ISDIR(info.st_mode)) {
       continue;
     }
-    if (isBlueLight(splitLedName(name))) {
+    const LedName parts = splitLedName(name);
+    if (selection_ == LedSelection::IdentifyOnly ? isIdentifyLed(parts) : isBlueLight(parts)) {
       lights.push_back(std::move(name));
     }
   }
@@ -171,6 +176,27 @@ std::vector<InstrumentationNode> SysfsLedSource::readNodes() const {
     nodes.push_back(std::move(node));
   }
   return nodes;
+}
+
+std::unique_ptr<InstrumentationSource> makeSysfsLedSource(std::string_view rest,
+                                                          std::shared_ptr<FileSystem> files) {
+  // A '?' starts the options, as in every other source text; no LED class folder has one.
+  const auto [directory, optionText] = splitAtQuestionMark(rest);
+  std::map<std::string, std::string> options = parseOptionList(optionText);
+  LedSelection selection = LedSelection::BlueOrIdentify;
+  if (auto found = options.find("lights"); found != options.end()) {
+    if (equalsIgnoringCase(found->second, "identify")) {
+      selection = LedSelection::IdentifyOnly;
+    } else if (!equalsIgnoringCase(found->second, "blue-or-identify")) {
+      throw SourceError("lights=" + printable(found->second) +
+                        " must be lights=identify or lights=blue-or-identify");
+    }
+    options.erase(found);
+  }
+  refuseUnknownOptions(options, "lights");
+  return std::make_unique<SysfsLedSource>(
+      directory.empty() ? std::string(kDefaultSysfsLedDirectory) : std::string(directory),
+      std::move(files), selection);
 }
 
 }  // namespace platform

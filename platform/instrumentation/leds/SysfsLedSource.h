@@ -35,6 +35,13 @@ LedName splitLedName(std::string_view name);
 // must be identify, identification, locate, locator or uid (so "identify-1", "chassis_locate"
 // and "uid" count; "indicator" and "id" alone do not). Case is ignored.
 bool isBlueLight(const LedName& name);
+// The second half of that rule alone: a function that names identification, whatever the colour.
+bool isIdentifyLed(const LedName& name);
+
+// Which LEDs a source publishes: those of isBlueLight (the default), or only those of
+// isIdentifyLed ("sysfs:<dir>?lights=identify"; what auto reads, because a blue LED that does
+// not identify anything - a laptop's power light, say - is not an identify light).
+enum class LedSelection { BlueOrIdentify, IdentifyOnly };
 
 // The alarm state (node property 1) of an LED: 1 off, 2 steady, 3 alternating. `trigger` is the
 // active trigger (the word in brackets in the trigger file; "none" when there is no trigger
@@ -53,10 +60,14 @@ class SysfsLedSource final : public InstrumentationSource {
  public:
   // The class folder is read through `files`: the real file system, or a test's.
   explicit SysfsLedSource(std::string directory,
-                          std::shared_ptr<FileSystem> files = systemFileSystem())
-      : directory_(std::move(directory)), files_(std::move(files)) {}
+                          std::shared_ptr<FileSystem> files = systemFileSystem(),
+                          LedSelection selection = LedSelection::BlueOrIdentify)
+      : directory_(std::move(directory)), files_(std::move(files)), selection_(selection) {}
 
-  std::string name() const override { return "sysfs:" + directory_; }
+  std::string name() const override {
+    return "sysfs:" + directory_ +
+           (selection_ == LedSelection::IdentifyOnly ? "?lights=identify" : "");
+  }
   // One node of type 26 per blue light, sorted by directory name; path text = directory name,
   // description = kSysfsLedDescription. A light whose state can be read has status 1 and the
   // alarm state property; one whose trigger or brightness cannot be read is still listed, with
@@ -66,7 +77,13 @@ class SysfsLedSource final : public InstrumentationSource {
  private:
   std::string directory_;
   std::shared_ptr<FileSystem> files_;
+  LedSelection selection_;
 };
+
+// The source for the text after "sysfs:": "[<directory>][?lights=identify|blue-or-identify]",
+// the directory /sys/class/leds when none is named. Throws SourceError for other options.
+std::unique_ptr<InstrumentationSource> makeSysfsLedSource(std::string_view rest,
+                                                          std::shared_ptr<FileSystem> files);
 
 }  // namespace platform
 }  // namespace Kesta
