@@ -414,7 +414,7 @@ std::string hardwareDirectory() {
   static const std::string directory = [] {
     std::string pattern = "/dev/shm/bluelight-bench.XXXXXX";
     if (::access("/dev/shm", W_OK) == 0 && ::mkdtemp(pattern.data()) != nullptr) return pattern;
-    const std::string fallback = scratchDirectory() + "/hardware";
+    std::string fallback = scratchDirectory() + "/hardware";
     std::filesystem::create_directories(fallback);
     return fallback;
   }();
@@ -442,8 +442,9 @@ std::string enclosureClass(int slots) {
       {"0:0:8:0", "0x500605b0000272bf"}, {"0:0:9:0", "0x500605b0000272c0"}};
   for (std::size_t e = 0; e < enclosures.size(); ++e) {
     const auto& [name, id] = enclosures[e];
-    const std::string relative = "devices/host0/target" + name.substr(0, name.size() - 2) + "/" +
-                                 name + "/enclosure/" + name;
+    const std::filesystem::path relative = std::filesystem::path("devices/host0") /
+                                           ("target" + name.substr(0, name.size() - 2)) / name /
+                                           "enclosure" / name;
     const std::filesystem::path enclosure = root / relative;
     writeText(enclosure / "id", id + "\n");
     writeText(enclosure / "components", std::to_string(slots) + "\n");
@@ -452,7 +453,7 @@ std::string enclosureClass(int slots) {
     std::filesystem::create_directory_symlink("../../../" + name, enclosure / "device");
     std::filesystem::create_directory_symlink("../../../../../../class/enclosure",
                                               enclosure / "subsystem");
-    std::filesystem::create_directory_symlink("../../" + relative, classDirectory / name);
+    std::filesystem::create_directory_symlink("../.." / relative, classDirectory / name);
     for (int slot = 0; slot < slots; ++slot) {
       const std::string label = (slot + 1 < 10 ? "SLOT 0" : "SLOT ") + std::to_string(slot + 1);
       const std::filesystem::path bay = enclosure / (e == 0 ? label : std::to_string(slot));

@@ -89,8 +89,14 @@ std::string garbageLine(const std::string& source) {
          "0x500605b0000272bf\": it holds \"2\", not 0 or 1";
 }
 
+// `name` in `directory`.
+std::string in(const std::string& directory, const std::string& name) {
+  return directory + "/" + name;
+}
+
 std::vector<std::string> paths(const std::vector<InstrumentationNode>& nodes) {
   std::vector<std::string> result;
+  result.reserve(nodes.size());
   for (const InstrumentationNode& node : nodes) {
     result.push_back(node.path);
   }
@@ -112,7 +118,7 @@ class MemoryClass {
 
   // Adds enclosure `name`; without `id` it has no id attribute. Returns its directory.
   std::string enclosure(const std::string& name, const std::optional<std::string>& id) {
-    const std::string directory = "/t/sys/devices/host0/" + name + "/enclosure/" + name;
+    std::string directory = "/t/sys/devices/host0/" + name + "/enclosure/" + name;
     files->addDirectory(directory);
     files->addFile(directory + "/components", "0\n");
     files->addFile(directory + "/uevent", "");
@@ -175,10 +181,11 @@ TEST(EnclosureSource, ReadsIdOncePerEnclosureSlotAndLocateOncePerLightAndNothing
   for (const std::string component :
        {"0:0:8:0/0", "0:0:8:0/1", "0:0:8:0/3", "0:0:8:0/10", "0:0:9:0/SLOT 01", "0:0:9:0/SLOT 02",
         "0:0:9:0/SLOT 10", "0:0:9:0/ArrayDevice05"}) {
-    EXPECT_EQ(files->count(Call::Open, kFixture + "/" + component + "/locate"), 1u) << component;
-    EXPECT_EQ(files->count(Call::Read, kFixture + "/" + component + "/locate"), 2u)
+    const std::string directory = in(kFixture, component);
+    EXPECT_EQ(files->count(Call::Open, in(directory, "locate")), 1u) << component;
+    EXPECT_EQ(files->count(Call::Read, in(directory, "locate")), 2u)
         << component << ": the value, then the end of the file";
-    EXPECT_EQ(files->count(Call::Open, kFixture + "/" + component + "/slot"), 1u) << component;
+    EXPECT_EQ(files->count(Call::Open, in(directory, "slot")), 1u) << component;
   }
   // Every open is one of those, and the listings are the class and the two enclosures.
   std::size_t opens = 0;
@@ -236,6 +243,8 @@ TEST(EnclosureSource, AnUnreadableLocateDegradesThatLightAloneWithOneLogLineEach
 TEST(EnclosureSource, AnEnclosureThatCannotBeListedLosesOnlyItsOwnLights) {
   const std::vector<InstrumentationNode> all = fixtureLights(3u);
   const std::vector<InstrumentationNode> ofEnclosure9(all.begin() + 4, all.end());
+  const std::string cannotList = kLogPrefix + "Instrumentation source \"enclosure:" + kFixture +
+                                 "\" cannot list enclosure \"0:0:8:0\": ";
   for (const Call call : {Call::OpenDirectory, Call::List}) {
     const auto files = FakeFileSystem::overRealFiles();
     files->fail(call, kEnclosure8, call == Call::List ? EIO : EACCES);
@@ -243,9 +252,7 @@ TEST(EnclosureSource, AnEnclosureThatCannotBeListedLosesOnlyItsOwnLights) {
     EXPECT_EQ(EnclosureSource(kFixture, files).readNodes(), ofEnclosure9);
     EXPECT_EQ(platform_test::rawLines(capture),
               (std::vector<std::string>{
-                  kLogPrefix + "Instrumentation source \"enclosure:" + kFixture +
-                      "\" cannot list enclosure \"0:0:8:0\": " +
-                      (call == Call::List ? "Input/output error" : "Permission denied"),
+                  cannotList + (call == Call::List ? "Input/output error" : "Permission denied"),
                   garbageLine("enclosure:" + kFixture)}));
     EXPECT_EQ(files->count(Call::Open, kEnclosure8 + "/id"), 0u);
     EXPECT_EQ(files->openDescriptors(), 0u);
@@ -466,8 +473,9 @@ TEST(EnclosureSource, TheEnclosuresOwnEntriesAreNeverComponents) {
   const std::string enclosure = tree.enclosure("0:0:8:0", std::nullopt);
   // Were they taken for components, each of these would be a light.
   for (const std::string own : {"power", "components", "id", "uevent"}) {
-    tree.files->remove(enclosure + "/" + own);
-    tree.files->addFile(enclosure + "/" + own + "/locate", "1\n");
+    const std::string directory = in(enclosure, own);
+    tree.files->remove(directory);
+    tree.files->addFile(in(directory, "locate"), "1\n");
   }
   tree.files->addFile("/t/sys/devices/host0/0:0:8:0/locate", "1\n");  // behind `device`
   tree.component(enclosure, "1", "0\n");
