@@ -9,7 +9,9 @@
 //          nodes (what reading the hardware costs).
 //
 // Beside them the snapshot parser (parseNodeSnapshot) is measured on its own, on the text of
-// Walk/4096's tree (4,608 nodes) and of a tree of 65,537 nodes.
+// Walk/4096's tree (4,608 nodes) and of a tree of 65,537 nodes, and the walk of the server's own
+// hardware classes (Walk.EnclosureLeds/N): an enclosure class of two enclosures of 24 or 96 bays
+// and an LED class, laid out as the kernel lays them out, on tmpfs.
 //
 // The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
 // itself twice: once with the sink "none" and once with every line written to a file. Each run
@@ -48,12 +50,18 @@
 #include "AllocCounter.h"
 #include "KestaInstrumentation.h"
 #include "cmpihost/cmpihost.h"
+#include "instrumentation/enclosure/EnclosureSource.h"
 #include "instrumentation/json/SnapshotParser.h"
+#include "instrumentation/leds/SysfsLedSource.h"
 
 namespace {
 
 const std::vector<int> kLightCounts = {1, 16, 256, 4096};
 constexpr int kAssociationLights = 256;
+// Walk.EnclosureLeds: two enclosures of this many bays, and the LED class's blue lights.
+constexpr int kEnclosureSlots = 24;
+constexpr int kEnclosureSlotsLarge = 96;
+constexpr int kBlueLeds = 2;
 const std::string kSystemName = "bbhost.example";
 const std::string kNameSpace = "root/cimv2";
 
@@ -367,26 +375,139 @@ Operation floorNames(int count) {
   };
 }
 
+// Reads every light of an open cursor as the provider does; returns their number.
+std::size_t walkLights(Kesta::Instrumentation& cursor) {
+  std::size_t lights = 0;
+  cursor.selectNode(Kesta::NodeLexicon::NODE_TYPE_BLUE_LIGHT);
+  while (cursor) {
+    std::string path = cursor.getPathToNode();
+    std::string description = cursor.getNodeDescription();
+    unsigned int status = cursor.getNodeStatus();
+    unsigned int alarmState = 0;
+    cursor.getProperty(Kesta::NodeLexicon::PROPERTY_ALARM_STATE, alarmState);
+    benchmark::DoNotOptimize(path);
+    benchmark::DoNotOptimize(description);
+    benchmark::DoNotOptimize(status);
+    benchmark::DoNotOptimize(alarmState);
+    ++lights;
+    ++cursor;
+  }
+  return lights;
+}
+
 // The walk: what the platform costs to read the tree, the same way the provider reads it.
 Operation walk() {
   return [] {
     Kesta::Instrumentation cursor;
-    std::size_t lights = 0;
-    cursor.selectNode(Kesta::NodeLexicon::NODE_TYPE_BLUE_LIGHT);
-    while (cursor) {
-      std::string path = cursor.getPathToNode();
-      std::string description = cursor.getNodeDescription();
-      unsigned int status = cursor.getNodeStatus();
-      unsigned int alarmState = 0;
-      cursor.getProperty(Kesta::NodeLexicon::PROPERTY_ALARM_STATE, alarmState);
-      benchmark::DoNotOptimize(path);
-      benchmark::DoNotOptimize(description);
-      benchmark::DoNotOptimize(status);
-      benchmark::DoNotOptimize(alarmState);
-      ++lights;
-      ++cursor;
+    return walkLights(cursor);
+  };
+}
+
+// ---------------------------------------------------------------------------------------------
+// The hardware classes: enclosures and LEDs
+// ---------------------------------------------------------------------------------------------
+
+// Where the class trees are written: tmpfs, which is what sysfs is closest to (in memory, no
+// disk, no page cache to warm). /dev/shm when it is writable, else the scratch directory. The
+// child that made it removes it (removeHardwareTrees).
+std::string hardwareDirectory() {
+  static const std::string directory = [] {
+    std::string pattern = "/dev/shm/bluelight-bench.XXXXXX";
+    if (::access("/dev/shm", W_OK) == 0 && ::mkdtemp(pattern.data()) != nullptr) return pattern;
+    std::string fallback = scratchDirectory() + "/hardware";
+    std::filesystem::create_directories(fallback);
+    return fallback;
+  }();
+  return directory;
+}
+
+void writeText(const std::filesystem::path& file, const std::string& text) {
+  std::filesystem::create_directories(file.parent_path());
+  std::ofstream out(file);
+  out << text;
+  if (!out) throw std::runtime_error("cannot write " + file.string());
+}
+
+// An enclosure class of two enclosures of `slots` bays each, as the kernel shows it: the class
+// holds links into the device tree; an enclosure holds id, components, uevent, power/ and the
+// device and subsystem links beside its components; a bay holds its seven attributes and, when a
+// disk is in it, a device link. The first enclosure names its bays "SLOT 01", ..., the second
+// numbers them. One bay in five is lit. Returns the class directory.
+std::string enclosureClass(int slots) {
+  const std::filesystem::path root =
+      hardwareDirectory() + "/enclosures-" + std::to_string(slots) + "/sys";
+  const std::filesystem::path classDirectory = root / "class/enclosure";
+  std::filesystem::create_directories(classDirectory);
+  const std::vector<std::pair<std::string, std::string>> enclosures = {
+      {"0:0:8:0", "0x500605b0000272bf"}, {"0:0:9:0", "0x500605b0000272c0"}};
+  for (std::size_t e = 0; e < enclosures.size(); ++e) {
+    const auto& [name, id] = enclosures[e];
+    const std::filesystem::path relative = std::filesystem::path("devices/host0") /
+                                           ("target" + name.substr(0, name.size() - 2)) / name /
+                                           "enclosure" / name;
+    const std::filesystem::path enclosure = root / relative;
+    writeText(enclosure / "id", id + "\n");
+    writeText(enclosure / "components", std::to_string(slots) + "\n");
+    writeText(enclosure / "uevent", "");
+    writeText(enclosure / "power/control", "auto\n");
+    std::filesystem::create_directory_symlink("../../../" + name, enclosure / "device");
+    std::filesystem::create_directory_symlink("../../../../../../class/enclosure",
+                                              enclosure / "subsystem");
+    std::filesystem::create_directory_symlink("../.." / relative, classDirectory / name);
+    for (int slot = 0; slot < slots; ++slot) {
+      const std::string label = (slot + 1 < 10 ? "SLOT 0" : "SLOT ") + std::to_string(slot + 1);
+      const std::filesystem::path bay = enclosure / (e == 0 ? label : std::to_string(slot));
+      writeText(bay / "locate", slot % 5 == 0 ? "1\n" : "0\n");
+      writeText(bay / "slot", std::to_string(e == 0 ? slot + 1 : slot) + "\n");
+      writeText(bay / "fault", "0\n");
+      writeText(bay / "active", "0\n");
+      writeText(bay / "status", slot % 4 == 3 ? "not installed\n" : "OK\n");
+      writeText(bay / "type", "array device\n");
+      writeText(bay / "power_status", "on\n");
+      if (slot % 4 != 3) {
+        std::filesystem::create_directory_symlink(
+            "../../../../../target0:0:" + std::to_string(slot) + "/0:0:" + std::to_string(slot) +
+                ":0",
+            bay / "device");
+      }
     }
-    return lights;
+  }
+  return classDirectory.string();
+}
+
+// An LED class of eight LEDs, two of them blue lights (a blinking uid and a lit locate).
+std::string ledClass() {
+  const std::filesystem::path root = hardwareDirectory() + "/leds/sys";
+  const std::filesystem::path classDirectory = root / "class/leds";
+  std::filesystem::create_directories(classDirectory);
+  const std::vector<std::pair<std::string, std::string>> leds = {
+      {"input3::capslock", "[none] kbd-capslock"},     {"input3::numlock", "[none] kbd-numlock"},
+      {"input3::scrolllock", "[none] kbd-scrolllock"}, {"platform::mute", "[none] audio-mute"},
+      {"platform::micmute", "[none] audio-micmute"},   {"mmc0::", "none [mmc0]"},
+      {"server:blue:uid", "none [timer] heartbeat"},   {"chassis::locate", "[none] timer"}};
+  for (const auto& [name, trigger] : leds) {
+    const std::string relative = "devices/platform/leds/leds/" + name;
+    writeText(root / relative / "trigger", trigger + "\n");
+    writeText(root / relative / "brightness", name == "chassis::locate" ? "255\n" : "0\n");
+    writeText(root / relative / "max_brightness", "255\n");
+    std::filesystem::create_directory_symlink("../../" + relative, classDirectory / name);
+  }
+  return classDirectory.string();
+}
+
+void removeHardwareTrees() {
+  std::error_code ignored;
+  std::filesystem::remove_all(hardwareDirectory(), ignored);
+}
+
+// Both classes read as a server with enclosures and LEDs is read: each source made afresh and
+// walked, one after the other.
+Operation hardwareWalk(const std::string& enclosures, const std::string& leds) {
+  return [enclosures, leds] {
+    Kesta::Instrumentation enclosureCursor(
+        std::make_unique<Kesta::platform::EnclosureSource>(enclosures));
+    Kesta::Instrumentation ledCursor(std::make_unique<Kesta::platform::SysfsLedSource>(leds));
+    return walkLights(enclosureCursor) + walkLights(ledCursor);
   };
 }
 
@@ -464,12 +585,13 @@ struct Figures {
 
 std::map<std::string, Figures> figures;  // by benchmark name, e.g. "EnumerateInstances/4096"
 
+// `jsonTree`: the operation reads the JSON tree of `count` lights (KESTA_INSTRUMENTATION).
 void registerOperation(const std::string& name, int count, Operation operation,
-                       std::size_t expected) {
+                       std::size_t expected, bool jsonTree = true) {
   benchmark::RegisterBenchmark(
       (name + "/" + std::to_string(count)).c_str(),
-      [count, operation, expected, name](benchmark::State& state) {
-        useTree(count);
+      [count, operation, expected, name, jsonTree](benchmark::State& state) {
+        if (jsonTree) useTree(count);
         // One operation first: it checks the answer and warms the caches (catalogue, host).
         const std::size_t got = operation();
         if (got != expected) {
@@ -573,6 +695,13 @@ int runChild() {
   }
   if (options.sink == "none") {
     registerParsers(prefix);
+    const std::string leds = ledClass();
+    for (const int slots : {kEnclosureSlots, kEnclosureSlotsLarge}) {
+      const int lights = 2 * slots + kBlueLeds;
+      registerOperation(prefix + "Walk.EnclosureLeds", lights,
+                        hardwareWalk(enclosureClass(slots), leds), static_cast<std::size_t>(lights),
+                        false);
+    }
     const auto n = static_cast<std::size_t>(kAssociationLights);
     const std::string association = "KESTA_BlueLightElementCapabilities";
     const std::string systemDevice = "KESTA_BlueLightSystemDevice";
@@ -598,6 +727,7 @@ int runChild() {
   benchmark::Initialize(&argumentCount, arguments.data());
   CollectingReporter reporter;
   benchmark::RunSpecifiedBenchmarks(&reporter);
+  if (options.sink == "none") removeHardwareTrees();
 
   long long growth = 0;
   std::size_t liveObjects = 0;
@@ -751,6 +881,16 @@ std::vector<Check> checks(const Results& r) {
       {"peak heap per light at 4096 / at 256, EnumerateInstances, sink none",
        peakPerLight("none:EnumerateInstances/4096") / peakPerLight("none:EnumerateInstances/256"),
        1.3, ""});
+  // The server's own hardware classes: a shelf pair of 24 bays and the LEDs within 2 ms, and
+  // the cost per light the same at 96 bays.
+  const std::string smallWalk =
+      "none:Walk.EnclosureLeds/" + std::to_string(2 * kEnclosureSlots + kBlueLeds);
+  const std::string largeWalk =
+      "none:Walk.EnclosureLeds/" + std::to_string(2 * kEnclosureSlotsLarge + kBlueLeds);
+  list.push_back({"enclosures (2 x 24 bays) + LED class walk, ms",
+                  r.has(smallWalk) ? r.ns(smallWalk) / 1e6 : static_cast<double>(NAN), 2.0, ""});
+  list.push_back({"ns per light at 2 x 96 bays / at 2 x 24, enclosures + LED class walk",
+                  perLight(largeWalk) / perLight(smallWalk), 1.3, ""});
   if (r.growthOps >= 0) {
     list.push_back(
         {"heap growth over " + std::to_string(r.growthOps) + " EnumerateInstances(256), bytes",

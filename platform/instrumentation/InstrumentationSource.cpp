@@ -5,6 +5,7 @@
 #include <mutex>
 
 #include "KestaCommonBase.h"
+#include "instrumentation/enclosure/EnclosureSource.h"
 #include "instrumentation/ipmi/IpmiSource.h"
 #include "instrumentation/json/JsonFileSource.h"
 #include "instrumentation/leds/SysfsLedSource.h"
@@ -56,12 +57,15 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
   if (colon != std::string_view::npos && scheme == "sysfs") {
     return makeSysfsLedSource(rest, system.files);
   }
+  if (colon != std::string_view::npos && scheme == "enclosure") {
+    return makeEnclosureSource(rest, system.files);
+  }
   if (colon != std::string_view::npos && (scheme == "ipmi" || scheme == "ipmi-lan")) {
     return makeIpmiSource(text, IpmiSourceSystem{system.clock, system.files, system.ipmiDevice});
   }
   throw SourceError(
-      "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
-      "ipmi-lan:<host>?credentials=<file>)");
+      "unknown kind of source (expected file:<path>, sysfs:<directory>, enclosure:[<directory>], "
+      "ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
 }
 
 std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text) {
