@@ -18,8 +18,8 @@
 
 #include "KestaCommonBase.h"
 #include "VNLog.h"
-#include "os/FileIo.h"
 #include "logging/LogFormat.h"
+#include "os/FileIo.h"
 #include "text/Text.h"
 
 namespace VNLog {

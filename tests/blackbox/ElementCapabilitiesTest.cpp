@@ -52,17 +52,24 @@ std::string warning(const std::string& text) { return "2 " + kComponent + ": " +
 // spelt out so that a lost or added blank is seen.
 const std::string kBuilderNoLightPathsTrace =
     "***Can't get BlueLight ObjectPaths." + blanks(13) + "Exiting EnumerateInstanceNames***";
-const std::string kBuilderLightPathNullStatus = "CMPIObjectPath is" + blanks(17) + "NULL for BlueLight";
+const std::string kBuilderLightPathNullStatus =
+    "CMPIObjectPath is" + blanks(17) + "NULL for BlueLight";
 const std::string kBuilderLightPathNullTrace = "CMPIObjectPath is NULL for BlueLight";
-const std::string kBuilderNoCapabilitiesPathsTrace = "***Can't get ObjectPaths for" + blanks(17) + "Capabilities" +
-                             blanks(17) + "Exiting EnumerateInstanceNames***";
-const std::string kBuilderCapabilitiesCheckStatus = "CMPIObjectPath is" + blanks(21) + "NULL for Capabilities";
+const std::string kBuilderNoCapabilitiesPathsTrace = "***Can't get ObjectPaths for" + blanks(17) +
+                                                     "Capabilities" + blanks(17) +
+                                                     "Exiting EnumerateInstanceNames***";
+const std::string kBuilderCapabilitiesCheckStatus =
+    "CMPIObjectPath is" + blanks(21) + "NULL for Capabilities";
 const std::string kBuilderCapabilitiesCheckTrace = "CMPIObjectPath is NULL for Capabilities";
-const std::string kBuilderAssociationPathStatus = "Create CMPIObjectPath failed for ElementCapabilities";
-const std::string kBuilderAssociationPathTrace = "Create CMPIObjectPath failed for ElementCapabilities.";
+const std::string kBuilderAssociationPathStatus =
+    "Create CMPIObjectPath failed for ElementCapabilities";
+const std::string kBuilderAssociationPathTrace =
+    "Create CMPIObjectPath failed for ElementCapabilities.";
 const std::string kNamesLightPathNullText = "CMPIObjectPath is NULL for BlueLight class";
-const std::string kNamesCapabilitiesPathNullStatus = "CMPIObjectPath is" + blanks(21) + "NULL for BlueLightCapabilities";
-const std::string kNamesCapabilitiesPathNullTrace = "CMPIObjectPath is NULL for" + blanks(21) + "Capabilities";
+const std::string kNamesCapabilitiesPathNullStatus =
+    "CMPIObjectPath is" + blanks(21) + "NULL for BlueLightCapabilities";
+const std::string kNamesCapabilitiesPathNullTrace =
+    "CMPIObjectPath is NULL for" + blanks(21) + "Capabilities";
 const std::string kNamesAssociationPathStatus =
     "Create CMPIObjectPath failed" + blanks(21) + "for ElementCapabilities";
 const std::string kNamesAssociationPathTrace =
@@ -274,7 +281,8 @@ TEST_F(ElementCapabilitiesInstanceTest, NamesFailWhenTheAssociationPathCannotBeM
   expectLines({entering(kEnumNames, kFile, kNamesList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, NamesKeepTheFirstPairWhenTheSecondAssociationPathHasNoHandle) {
+TEST_F(ElementCapabilitiesInstanceTest,
+       NamesKeepTheFirstPairWhenTheSecondAssociationPathHasNoHandle) {
   useTree({blueLight("1"), blueLight("2")});
   // Two lights, then per light its capabilities path and its association path.
   broker_.armFault(Fault::nullHandle(CreatingFunction::NewObjectPath, 6));
@@ -315,13 +323,14 @@ TEST_F(ElementCapabilitiesInstanceTest, CapabilitiesFailureOnTheSecondLightKeeps
 // ---------------------------------------------------------------------------------------------
 
 TEST_F(ElementCapabilitiesInstanceTest, EnumInstancesWithoutLightsStillEndsNormally) {
-  // The builder fails for want of light paths; unlike EnumInstanceNames, the enumeration ends with its exit
-  // line and CMReturnDone.
+  // The builder fails for want of light paths; unlike EnumInstanceNames, the enumeration ends with
+  // its exit line and CMReturnDone.
   const Outcome outcome = enumerate();
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   ASSERT_EQ(outcome.results.size(), 1u);
   EXPECT_EQ(outcome.results[0].kind, ResultKind::Done);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
+  EXPECT_EQ(traces(outcome),
+            (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
   EXPECT_TRUE(newStrings(outcome).empty());
   expectBuilderFailureLines(kEnum, kEnumList);
 }
@@ -436,7 +445,8 @@ TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheLightPathsCannotB
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kLightPathFailedTrace, warning(kBuilderNoLightPathsTrace)}));
+  EXPECT_EQ(traces(outcome),
+            (std::vector<std::string>{kLightPathFailedTrace, warning(kBuilderNoLightPathsTrace)}));
   // Only the factory's own message; the builder's failure for want of light paths has none.
   EXPECT_EQ(newStrings(outcome), std::vector<std::string>{"Create CMPIObjectPath failed."});
   expectBuilderFailureLines(kEnum, kEnumList);
@@ -476,12 +486,14 @@ TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheCapabilitiesPaths
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kBuilderNoCapabilitiesPathsTrace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace,
+                                                       warning(kBuilderNoCapabilitiesPathsTrace)}));
   EXPECT_EQ(newStrings(outcome), std::vector<std::string>{"Create CMPIObjectPath failed"});
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheSecondLightsCapabilitiesPathCannotBeMade) {
+TEST_F(ElementCapabilitiesInstanceTest,
+       InstancesAreNoneWhenTheSecondLightsCapabilitiesPathCannotBeMade) {
   useTree({blueLight("1"), blueLight("2")});
   // Lights 1 and 2, capabilities and association of light 1, then capabilities of light 2.
   broker_.armFault(Fault::nullResult(CreatingFunction::NewObjectPath, 5));
@@ -490,11 +502,13 @@ TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheSecondLightsCapab
   EXPECT_EQ(callCount(outcome, "CMPIBrokerEncFT", "newInstance"), 1u);
   EXPECT_EQ(outcome.count(ResultKind::Instance), 0u);
   EXPECT_EQ(outcome.doneCount, 1u);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace, warning(kBuilderNoCapabilitiesPathsTrace)}));
+  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kCapPathFailedTrace,
+                                                       warning(kBuilderNoCapabilitiesPathsTrace)}));
   expectBuilderFailureLines(kEnum, kEnumList);
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenALightPathLosesItsHandleAfterItsNamespaceIsSet) {
+TEST_F(ElementCapabilitiesInstanceTest,
+       InstancesAreNoneWhenALightPathLosesItsHandleAfterItsNamespaceIsSet) {
   useTree({blueLight("1")});
   // The factory sets the light's namespace (1), then the builder sets it again (2): the path
   // passes the first check and fails the one before the capabilities.
@@ -524,7 +538,8 @@ TEST_F(ElementCapabilitiesInstanceTest, CapabilitiesPathWithoutHandleIsNotChecke
                exiting(kBuilder, kFile, kBuilderList), exiting(kEnum, kFile, kEnumList)});
 }
 
-TEST_F(ElementCapabilitiesInstanceTest, InstancesAreNoneWhenTheAssociationPathIsNotMadeOrHasNoHandle) {
+TEST_F(ElementCapabilitiesInstanceTest,
+       InstancesAreNoneWhenTheAssociationPathIsNotMadeOrHasNoHandle) {
   for (const Fault& fault : {Fault::nullResult(CreatingFunction::NewObjectPath, 3),
                              Fault::nullHandle(CreatingFunction::NewObjectPath, 3)}) {
     SCOPED_TRACE(::testing::PrintToString(fault.kind));
@@ -559,7 +574,8 @@ TEST_F(ElementCapabilitiesInstanceTest, GetInstanceWithoutLightsFindsNothing) {
   EXPECT_EQ(outcome.status, StatusValue(CMPI_RC_OK));
   ASSERT_EQ(outcome.results.size(), 1u);
   EXPECT_EQ(outcome.results[0].kind, ResultKind::Done);
-  EXPECT_EQ(traces(outcome), (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
+  EXPECT_EQ(traces(outcome),
+            (std::vector<std::string>{kNoLightsTrace, warning(kBuilderNoLightPathsTrace)}));
   expectBuilderFailureLines(kGet, kGetList);
 }
 

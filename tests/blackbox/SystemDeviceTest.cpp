@@ -383,7 +383,8 @@ TEST_F(SystemDeviceTest, NamesFailWhenTheComputerSystemPathCannotBeMade) {
   }
 }
 
-// The names fail: a light path that was fine when the factory made it and lost its handle afterwards.
+// The names fail: a light path that was fine when the factory made it and lost its handle
+// afterwards.
 TEST_F(SystemDeviceTest, NamesFailOnALightPathWithoutHandle) {
   // Each light path gets four keys; the fourth addKey is the last call on the first light path.
   broker_.armFault(Fault::invalidateHandle(ObjectFunction::pathAddKey(), 4));
@@ -596,7 +597,8 @@ TEST_F(SystemDeviceTest, InstancesStopAtALightPathWithoutHandle) {
   }
 }
 
-// The instances: an association path that cannot be made is reported, that light skipped, the rest goes on.
+// The instances: an association path that cannot be made is reported, that light skipped, the rest
+// goes on.
 TEST_F(SystemDeviceTest, InstancesSkipALightWhoseAssociationPathCannotBeMade) {
   const std::string call = "CMPIBrokerEncFT.newObjectPath(root/cimv2, " + kAssocClass + ")";
   const Outcome clean = instances();

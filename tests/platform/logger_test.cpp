@@ -12,8 +12,8 @@
 
 #include "PlatformTestSupport.h"
 #include "VNLog.h"
-#include "os/FileIo.h"
 #include "logging/LogFormat.h"
+#include "os/FileIo.h"
 
 namespace {
 

@@ -217,16 +217,15 @@ TEST_F(SourceListWalk, AFailingSourceWritesItsLineAndTheOthersStillGiveTheirs) {
   const SourceListReading reading =
       read("file:" + missing + ";bogus:x;file:" + good, "/etc/kesta/instrumentation.conf");
   EXPECT_EQ(pathsOf(reading.nodes), std::vector<std::string>{"1.1"});
-  EXPECT_EQ(
-      log_.lines(kCategory),
-      (std::vector<LogLine>{
-          failure("Instrumentation source \"file:" + missing +
-                  "\" (from /etc/kesta/instrumentation.conf) cannot be read: No such file or "
-                  "directory"),
-          failure("Instrumentation source \"bogus:x\" (from /etc/kesta/instrumentation.conf) "
-                  "cannot be read: unknown kind of source (expected file:<path>, "
-                  "sysfs:<directory>, enclosure:[<directory>], ipmi:[<device>] or "
-                  "ipmi-lan:<host>?credentials=<file>)")}));
+  EXPECT_EQ(log_.lines(kCategory),
+            (std::vector<LogLine>{
+                failure("Instrumentation source \"file:" + missing +
+                        "\" (from /etc/kesta/instrumentation.conf) cannot be read: No such file or "
+                        "directory"),
+                failure("Instrumentation source \"bogus:x\" (from /etc/kesta/instrumentation.conf) "
+                        "cannot be read: unknown kind of source (expected file:<path>, "
+                        "sysfs:<directory>, enclosure:[<directory>], ipmi:[<device>] or "
+                        "ipmi-lan:<host>?credentials=<file>)")}));
   ASSERT_EQ(reading.outcomes.size(), 3u);
   EXPECT_EQ(reading.outcomes[0].state, State::Unreadable);
   EXPECT_EQ(reading.outcomes[0].why, "No such file or directory");
