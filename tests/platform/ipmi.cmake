@@ -61,5 +61,5 @@ foreach(unit IN LISTS IPMI_TEST_UNITS)
 endforeach()
 
 # The provider tests load the built provider library into the in-process host.
-target_link_libraries(platform_ipmi_provider_test PRIVATE cmpihost)
+target_link_libraries(platform_ipmi_provider_test PRIVATE platform_test_provider)
 add_dependencies(platform_ipmi_provider_test bluelightprofileprovider)

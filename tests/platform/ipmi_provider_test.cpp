@@ -4,8 +4,6 @@
 // own clock, which the test moves, and a read that runs into its timeout is told by its log line.
 #include <gtest/gtest.h>
 
-#include <cmpihost/cmpihost.h>
-
 #include <algorithm>
 #include <chrono>
 #include <memory>
@@ -13,6 +11,7 @@
 #include <vector>
 
 #include "IpmiSimulator.h"
+#include "ProviderLights.h"
 #include "TestSupport.h"
 
 namespace {
@@ -20,16 +19,10 @@ namespace {
 using namespace std::chrono_literals;
 using ipmi_test::IpmiSimulator;
 using ipmi_test::SimulatorOptions;
+using platform_test::LightSeen;
+using platform_test::LoadedProvider;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
-
-// The parts of the one light that tell its state.
-struct LightSeen {
-  std::string deviceId;
-  unsigned long long alarmState = 99;
-  unsigned long long healthState = 99;
-  std::vector<unsigned long long> operationalStatus;
-};
 
 class IpmiProviderTest : public ::testing::Test {
  protected:
@@ -37,45 +30,15 @@ class IpmiProviderTest : public ::testing::Test {
     REQUIRE_IPMI_SIMULATOR();
     // The library's logger reads the environment at its first line, so the capture comes first.
     capture_ = std::make_unique<LogCapture>(6000);
-    library_ = std::make_unique<cmpihost::ProviderLibrary>(IPMI_TEST_PROVIDER_LIBRARY);
-    cmpihost::Request request(broker_);
-    load_ = cmpihost::createInstanceMI(*library_, "BlueLightProfileProvider", broker_, request);
-    ASSERT_TRUE(load_.ok()) << load_.error;
+    provider_ = std::make_unique<LoadedProvider>(IPMI_TEST_PROVIDER_LIBRARY);
+    ASSERT_TRUE(provider_->loaded());
   }
 
-  void TearDown() override {
-    if (load_.mi != nullptr) {
-      cmpihost::cleanup(broker_, load_.mi);
-    }
-  }
-
+  // The one light of the BMC.
   LightSeen enumerate() {
-    const cmpihost::Outcome outcome = cmpihost::enumerateInstances(
-        broker_, load_.mi, cmpihost::ObjectPathValue("root/cimv2", "KESTA_BlueLight"));
-    EXPECT_EQ(outcome.status.rc, CMPI_RC_OK) << outcome.status.message.value_or("");
-    const std::vector<cmpihost::InstanceValue> lights = outcome.instances();
-    LightSeen seen;
+    const std::vector<LightSeen> lights = provider_->enumerate();
     EXPECT_EQ(lights.size(), 1u);
-    if (lights.empty()) {
-      return seen;
-    }
-    const cmpihost::InstanceValue& light = lights.front();
-    if (const cmpihost::Value* id = light.find("DeviceID")) {
-      seen.deviceId = id->asString();
-    }
-    if (const cmpihost::Value* state = light.find("AlarmState"); state && !state->isNull()) {
-      seen.alarmState = state->asUnsigned();
-    }
-    if (const cmpihost::Value* health = light.find("HealthState"); health && !health->isNull()) {
-      seen.healthState = health->asUnsigned();
-    }
-    if (const cmpihost::Value* status = light.find("OperationalStatus");
-        status && !status->isNull()) {
-      for (const cmpihost::Value& element : status->elements()) {
-        seen.operationalStatus.push_back(element.asUnsigned());
-      }
-    }
-    return seen;
+    return lights.empty() ? LightSeen{} : lights.front();
   }
 
   std::vector<std::string> instrumentationLines() const {
@@ -84,9 +47,7 @@ class IpmiProviderTest : public ::testing::Test {
 
   ScopedEnv systemName_{"KESTA_SYSTEM_NAME", std::string("ipmi-test-host")};
   std::unique_ptr<LogCapture> capture_;
-  cmpihost::Broker broker_;
-  std::unique_ptr<cmpihost::ProviderLibrary> library_;
-  cmpihost::InstanceMILoad load_;
+  std::unique_ptr<LoadedProvider> provider_;
 };
 
 TEST_F(IpmiProviderTest, AlarmStateFollowsChassisIdentify) {

@@ -5,20 +5,21 @@
 // lights that came in another order, would show.
 #include <gtest/gtest.h>
 
-#include <cmpihost/cmpihost.h>
-
 #include <algorithm>
 #include <filesystem>
 #include <memory>
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
+#include "ProviderLights.h"
 #include "TestSupport.h"
 
 namespace {
 
+using platform_test::LightSeen;
+using platform_test::LoadedProvider;
+using platform_test::readableLight;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;
 using testsupport::TempDir;
@@ -26,40 +27,6 @@ using testsupport::TempDir;
 const std::string kEnclosureClass =
     std::string(PLATFORM_TEST_FIXTURES) + "/enclosure/sys/class/enclosure";
 const std::string kSystemName = "mixed-sources-host";
-
-// What a client reads of one light.
-struct LightSeen {
-  std::string deviceId;
-  std::string elementName;
-  unsigned long long alarmState = 99;
-  unsigned long long healthState = 99;
-
-  friend bool operator==(const LightSeen& a, const LightSeen& b) {
-    return a.deviceId == b.deviceId && a.elementName == b.elementName &&
-           a.alarmState == b.alarmState && a.healthState == b.healthState;
-  }
-  friend std::ostream& operator<<(std::ostream& out, const LightSeen& light) {
-    return out << "{" << light.deviceId << " | " << light.elementName << " | AlarmState "
-               << light.alarmState << " | HealthState " << light.healthState << "}";
-  }
-};
-
-LightSeen seen(const cmpihost::InstanceValue& instance) {
-  LightSeen light;
-  if (const cmpihost::Value* id = instance.find("DeviceID")) {
-    light.deviceId = id->asString();
-  }
-  if (const cmpihost::Value* name = instance.find("ElementName")) {
-    light.elementName = name->asString();
-  }
-  if (const cmpihost::Value* state = instance.find("AlarmState"); state && !state->isNull()) {
-    light.alarmState = state->asUnsigned();
-  }
-  if (const cmpihost::Value* health = instance.find("HealthState"); health && !health->isNull()) {
-    light.healthState = health->asUnsigned();
-  }
-  return light;
-}
 
 // `lights` in the order the provider hands them over whatever source they came from: by DeviceID,
 // byte by byte.
@@ -69,26 +36,20 @@ std::vector<LightSeen> inDeviceIdOrder(std::vector<LightSeen> lights) {
   return lights;
 }
 
-// A light that could be read (HealthState 5), DeviceID "<elementName>:<path>".
-LightSeen light(const std::string& elementName, const std::string& path,
-                unsigned long long alarmState) {
-  return {elementName + ":" + path, elementName, alarmState, 5};
-}
-
 // The lights of the committed enclosure tree (enclosure_source_test.cpp describes it), in the
 // order the source walks them.
 std::vector<LightSeen> enclosureLights() {
   const std::string shelf = " locate light, enclosure 0x500605b0000272bf";
   const std::string idless = " locate light, enclosure 0:0:8:0";
-  return {light("ArrayDevice05" + shelf, "enclosure/0x500605b0000272bf/ArrayDevice05", 1),
-          light("SLOT 01" + shelf, "enclosure/0x500605b0000272bf/1", 3),
-          light("SLOT 02" + shelf, "enclosure/0x500605b0000272bf/2", 1),
+  return {readableLight("ArrayDevice05" + shelf, "enclosure/0x500605b0000272bf/ArrayDevice05", 1),
+          readableLight("SLOT 01" + shelf, "enclosure/0x500605b0000272bf/1", 3),
+          readableLight("SLOT 02" + shelf, "enclosure/0x500605b0000272bf/2", 1),
           // `locate` holds 2: degraded, and no alarm state (the provider shows 0).
-          {"SLOT 10" + shelf + ":enclosure/0x500605b0000272bf/10", "SLOT 10" + shelf, 0, 10},
-          light("Slot 0" + idless, "enclosure/0:0:8:0/0", 1),
-          light("Slot 1" + idless, "enclosure/0:0:8:0/1", 3),
-          light("Slot 10" + idless, "enclosure/0:0:8:0/10", 1),
-          light("Slot 3" + idless, "enclosure/0:0:8:0/3", 1)};
+          {"SLOT 10" + shelf + ":enclosure/0x500605b0000272bf/10", "SLOT 10" + shelf, 0, 10, {3}},
+          readableLight("Slot 0" + idless, "enclosure/0:0:8:0/0", 1),
+          readableLight("Slot 1" + idless, "enclosure/0:0:8:0/1", 3),
+          readableLight("Slot 10" + idless, "enclosure/0:0:8:0/10", 1),
+          readableLight("Slot 3" + idless, "enclosure/0:0:8:0/3", 1)};
 }
 
 // The one log line of the enclosure tree: the bay whose `locate` holds 2, as named by `source`.
@@ -122,40 +83,13 @@ class MixedSourcesTest : public ::testing::Test {
     source_.emplace("KESTA_INSTRUMENTATION", source);
     // The library's logger reads the environment at its first line, so the capture comes first.
     capture_ = std::make_unique<LogCapture>(6000);
-    library_ = std::make_unique<cmpihost::ProviderLibrary>(PLATFORM_TEST_PROVIDER_LIBRARY);
-    cmpihost::Request request(broker_);
-    load_ = cmpihost::createInstanceMI(*library_, "BlueLightProfileProvider", broker_, request);
-    ASSERT_TRUE(load_.ok()) << load_.error;
+    provider_ = std::make_unique<LoadedProvider>(PLATFORM_TEST_PROVIDER_LIBRARY);
+    ASSERT_TRUE(provider_->loaded());
   }
 
-  void TearDown() override {
-    if (load_.mi != nullptr) {
-      cmpihost::cleanup(broker_, load_.mi);
-    }
-  }
-
-  std::vector<LightSeen> enumerate() {
-    const cmpihost::Outcome outcome = cmpihost::enumerateInstances(
-        broker_, load_.mi, cmpihost::ObjectPathValue("root/cimv2", "KESTA_BlueLight"));
-    EXPECT_EQ(outcome.status.rc, CMPI_RC_OK) << outcome.status.message.value_or("");
-    std::vector<LightSeen> lights;
-    for (const cmpihost::InstanceValue& instance : outcome.instances()) {
-      lights.push_back(seen(instance));
-    }
-    return lights;
-  }
-
+  std::vector<LightSeen> enumerate() { return provider_->enumerate(); }
   std::optional<LightSeen> get(const std::string& deviceId) {
-    cmpihost::ObjectPathValue path("root/cimv2", "KESTA_BlueLight");
-    path.addKey("CreationClassName", cmpihost::Value("KESTA_BlueLight"));
-    path.addKey("DeviceID", cmpihost::Value(deviceId));
-    path.addKey("SystemCreationClassName", cmpihost::Value("KESTA_ComputerSystem"));
-    path.addKey("SystemName", cmpihost::Value(kSystemName));
-    const cmpihost::Outcome outcome = cmpihost::getInstance(broker_, load_.mi, path);
-    if (outcome.status.rc != CMPI_RC_OK || outcome.instances().size() != 1) {
-      return std::nullopt;
-    }
-    return seen(outcome.instances().front());
+    return provider_->get(kSystemName, deviceId);
   }
 
   std::vector<std::string> instrumentationLines() const {
@@ -166,9 +100,7 @@ class MixedSourcesTest : public ::testing::Test {
   ScopedEnv systemName_{"KESTA_SYSTEM_NAME", kSystemName};
   std::optional<ScopedEnv> source_;
   std::unique_ptr<LogCapture> capture_;
-  cmpihost::Broker broker_;
-  std::unique_ptr<cmpihost::ProviderLibrary> library_;
-  cmpihost::InstanceMILoad load_;
+  std::unique_ptr<LoadedProvider> provider_;
 };
 
 TEST_F(MixedSourcesTest, AListGivesTheLightsOfEverySourceInOneEnumeration) {
@@ -180,16 +112,16 @@ TEST_F(MixedSourcesTest, AListGivesTheLightsOfEverySourceInOneEnumeration) {
 
   // Without a lights= option the LED class gives its blue LEDs and its identify LEDs.
   const std::vector<LightSeen> bays = enclosureLights();
-  std::vector<LightSeen> expected = {light("Front Panel Light", "1.1", 2)};
+  std::vector<LightSeen> expected = {readableLight("Front Panel Light", "1.1", 2)};
   expected.insert(expected.end(), bays.begin(), bays.end());
-  expected.push_back(light("Blue Light", "platform:blue:status", 2));
-  expected.push_back(light("Blue Light", "server::uid", 3));
+  expected.push_back(readableLight("Blue Light", "platform:blue:status", 2));
+  expected.push_back(readableLight("Blue Light", "server::uid", 3));
   EXPECT_EQ(enumerate(), inDeviceIdOrder(expected));
   EXPECT_EQ(instrumentationLines(), std::vector<std::string>{garbageLine(enclosure)});
 
   // Each light is found by its DeviceID whichever source it came from.
-  EXPECT_EQ(get("Front Panel Light:1.1"), light("Front Panel Light", "1.1", 2));
-  EXPECT_EQ(get("Blue Light:server::uid"), light("Blue Light", "server::uid", 3));
+  EXPECT_EQ(get("Front Panel Light:1.1"), readableLight("Front Panel Light", "1.1", 2));
+  EXPECT_EQ(get("Blue Light:server::uid"), readableLight("Blue Light", "server::uid", 3));
   EXPECT_EQ(get(bays[1].deviceId), bays[1]);
   EXPECT_EQ(get("Blue Light:input3::capslock"), std::nullopt);
 }
@@ -204,11 +136,10 @@ TEST_F(MixedSourcesTest, AutoFindsTheEnclosuresAndTheIdentifyLedsUnderTheDiscove
 
   // auto reads the LED class for identify LEDs only: the blue status LED is no light here.
   std::vector<LightSeen> expected = enclosureLights();
-  expected.push_back(light("Blue Light", "server::uid", 3));
+  expected.push_back(readableLight("Blue Light", "server::uid", 3));
   EXPECT_EQ(enumerate(), inDeviceIdOrder(expected));
-  EXPECT_EQ(instrumentationLines(),
-            std::vector<std::string>{garbageLine("enclosure:" + scratch_.path() +
-                                                 "/sys/class/enclosure")});
+  EXPECT_EQ(instrumentationLines(), std::vector<std::string>{garbageLine(
+                                        "enclosure:" + scratch_.path() + "/sys/class/enclosure")});
   EXPECT_EQ(get("Blue Light:platform:blue:status"), std::nullopt);
 }
 
