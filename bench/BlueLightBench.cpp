@@ -11,7 +11,8 @@
 // Beside them the snapshot parser (parseNodeSnapshot) is measured on its own, on the text of
 // Walk/4096's tree (4,608 nodes) and of a tree of 65,537 nodes, and the walk of the server's own
 // hardware classes (Walk.EnclosureLeds/N): an enclosure class of two enclosures of 24 or 96 bays
-// and an LED class, laid out as the kernel lays them out, on tmpfs.
+// and an LED class, laid out as the kernel lays them out, on tmpfs; and auto finding the same
+// classes under a discovery root (Walk.Auto/50).
 //
 // The provider's logger reads VNLOG_SINK and VNLOG_LEVEL once per process, so the program runs
 // itself twice: once with the sink "none" and once with every line written to a file. Each run
@@ -511,6 +512,29 @@ Operation hardwareWalk(const std::string& enclosures, const std::string& leds) {
   };
 }
 
+// The default configuration on a server without a BMC device but with both classes: auto finds
+// them under a discovery root (links to the trees above) and reads them in one walk, as the
+// provider does at every operation. Its cost over hardwareWalk is what finding the sources takes.
+std::string discoveryRoot(const std::string& enclosures, const std::string& leds) {
+  const std::filesystem::path root = hardwareDirectory() + "/auto";
+  std::filesystem::create_directories(root / "sys/class");
+  std::filesystem::create_directories(root / "dev");
+  std::filesystem::create_directory_symlink(enclosures, root / "sys/class/enclosure");
+  std::filesystem::create_directory_symlink(leds, root / "sys/class/leds");
+  return root.string();
+}
+
+Operation autoWalk(const std::string& root) {
+  return [root] {
+    ::setenv("KESTA_INSTRUMENTATION", "auto", 1);
+    ::setenv("KESTA_DISCOVERY_ROOT", root.c_str(), 1);
+    Kesta::Instrumentation cursor;
+    const std::size_t lights = walkLights(cursor);
+    ::unsetenv("KESTA_DISCOVERY_ROOT");
+    return lights;
+  };
+}
+
 // ---------------------------------------------------------------------------------------------
 // The snapshot parser
 // ---------------------------------------------------------------------------------------------
@@ -696,12 +720,19 @@ int runChild() {
   if (options.sink == "none") {
     registerParsers(prefix);
     const std::string leds = ledClass();
+    std::map<int, std::string> enclosures;
     for (const int slots : {kEnclosureSlots, kEnclosureSlotsLarge}) {
       const int lights = 2 * slots + kBlueLeds;
+      enclosures[slots] = enclosureClass(slots);
       registerOperation(prefix + "Walk.EnclosureLeds", lights,
-                        hardwareWalk(enclosureClass(slots), leds), static_cast<std::size_t>(lights),
+                        hardwareWalk(enclosures[slots], leds), static_cast<std::size_t>(lights),
                         false);
     }
+    // Both blue LEDs are identify LEDs, so auto finds every light the direct walk reads.
+    const int autoLights = 2 * kEnclosureSlots + kBlueLeds;
+    registerOperation(prefix + "Walk.Auto", autoLights,
+                      autoWalk(discoveryRoot(enclosures[kEnclosureSlots], leds)),
+                      static_cast<std::size_t>(autoLights), false);
     const auto n = static_cast<std::size_t>(kAssociationLights);
     const std::string association = "KESTA_BlueLightElementCapabilities";
     const std::string systemDevice = "KESTA_BlueLightSystemDevice";
@@ -891,6 +922,10 @@ std::vector<Check> checks(const Results& r) {
                   r.has(smallWalk) ? r.ns(smallWalk) / 1e6 : static_cast<double>(NAN), 2.0, ""});
   list.push_back({"ns per light at 2 x 96 bays / at 2 x 24, enclosures + LED class walk",
                   perLight(largeWalk) / perLight(smallWalk), 1.3, ""});
+  // auto over the same classes: finding the sources may add little to reading them.
+  const std::string autoWalk = "none:Walk.Auto/" + std::to_string(2 * kEnclosureSlots + kBlueLeds);
+  list.push_back({"auto walk / the same classes walked directly (2 x 24 bays + LEDs)",
+                  ratio(autoWalk, {smallWalk}), 1.3, ""});
   if (r.growthOps >= 0) {
     list.push_back(
         {"heap growth over " + std::to_string(r.growthOps) + " EnumerateInstances(256), bytes",
