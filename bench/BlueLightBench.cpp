@@ -129,7 +129,7 @@ std::string deviceIDOf(int index) { return "Blue Light:1." + std::to_string(inde
 // A tree of `count` blue lights with a mix of node statuses and alarm states, and a few nodes of
 // other types in between that the provider skips, as in a real tree.
 std::string treeFile(int count) {
-  const std::string file = scratchDirectory() + "/tree-" + std::to_string(count) + ".json";
+  std::string file = scratchDirectory() + "/tree-" + std::to_string(count) + ".json";
   std::ofstream out(file);
   out << "{\"nodes\": [\n";
   const unsigned statuses[] = {1, 1, 1, 20, 24, 0};
@@ -271,16 +271,16 @@ Operation getInstance(int count) {
   };
 }
 
-Operation associators(CMPIAssociationMI* Provider::*mi, cmpihost::ObjectPathValue source,
-                      std::string association) {
+Operation associators(CMPIAssociationMI* Provider::*mi, const cmpihost::ObjectPathValue& source,
+                      const std::string& association) {
   return [mi, source, association] {
     return handedOver(
         cmpihost::associators(provider->broker, (*provider).*mi, source, association));
   };
 }
 
-Operation references(CMPIAssociationMI* Provider::*mi, cmpihost::ObjectPathValue source,
-                     std::string association) {
+Operation references(CMPIAssociationMI* Provider::*mi, const cmpihost::ObjectPathValue& source,
+                     const std::string& association) {
   return [mi, source, association] {
     return handedOver(cmpihost::references(provider->broker, (*provider).*mi, source, association));
   };
@@ -610,7 +610,7 @@ struct Figures {
 std::map<std::string, Figures> figures;  // by benchmark name, e.g. "EnumerateInstances/4096"
 
 // `jsonTree`: the operation reads the JSON tree of `count` lights (KESTA_INSTRUMENTATION).
-void registerOperation(const std::string& name, int count, Operation operation,
+void registerOperation(const std::string& name, int count, const Operation& operation,
                        std::size_t expected, bool jsonTree = true) {
   benchmark::RegisterBenchmark(
       (name + "/" + std::to_string(count)).c_str(),
@@ -795,8 +795,9 @@ int runChildProcess(const std::string& sink, const std::string& resultsFile, cha
         argv[0], "--bench-child=" + sink, "--bench-results=" + resultsFile,
         "--bench-library=" + options.library,
         "--bench-growth-ops=" + std::to_string(options.growthOps)};
-    for (const std::string& argument : options.benchmarkArgs) arguments.push_back(argument);
+    arguments.insert(arguments.end(), options.benchmarkArgs.begin(), options.benchmarkArgs.end());
     std::vector<char*> pointers;
+    pointers.reserve(arguments.size() + 1);
     for (std::string& argument : arguments) pointers.push_back(argument.data());
     pointers.push_back(nullptr);
     ::execv("/proc/self/exe", pointers.data());
@@ -940,16 +941,21 @@ void printInformativeRatios(const Results& r) {
   for (const std::string sink : {"none", "file"}) {
     for (const int count : kLightCounts) {
       const std::string n = "/" + std::to_string(count);
-      const std::string walkKey = sink + ":Walk" + n;
+      // The keys of the results: "<sink>:<operation>/<count>".
+      const auto keyOf = [&sink](const std::string& operation) {
+        return std::string(sink).append(":").append(operation);
+      };
+      const std::string walkKey = keyOf("Walk" + n);
       const std::vector<std::pair<std::string, std::string>> pairs = {
-          {"EnumerateInstances", "Floor.Instances" + n},
-          {"EnumerateInstanceNames", "Floor.Names" + n},
-          {"GetInstance", "Floor.Instances/1"}};
+          {"EnumerateInstances" + n, "Floor.Instances" + n},
+          {"EnumerateInstanceNames" + n, "Floor.Names" + n},
+          {"GetInstance" + n, "Floor.Instances/1"}};
       for (const auto& [operation, floor] : pairs) {
-        const std::string key = sink + ":" + operation + n;
-        if (!r.has(key) || !r.has(walkKey) || !r.has(sink + ":" + floor)) continue;
+        const std::string key = keyOf(operation);
+        const std::string floorKey = keyOf(floor);
+        if (!r.has(key) || !r.has(walkKey) || !r.has(floorKey)) continue;
         std::cout << "  " << std::left << std::setw(40) << key << std::right
-                  << fixed(r.ns(key) / (r.ns(sink + ":" + floor) + r.ns(walkKey)), 2) << "\n";
+                  << fixed(r.ns(key) / (r.ns(floorKey) + r.ns(walkKey)), 2) << "\n";
       }
     }
   }

@@ -164,6 +164,9 @@ class ProviderException : public std::exception {
  public:
   explicit ProviderException(const char* message) : message_(message != nullptr ? message : "") {}
   ProviderException(const ProviderException& other) = default;
+  ProviderException(ProviderException&& other) = default;
+  ProviderException& operator=(const ProviderException& other) = default;
+  ProviderException& operator=(ProviderException&& other) = default;
   ~ProviderException() override = default;
 
   const char* what() const noexcept override { return message_.c_str(); }

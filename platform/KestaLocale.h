@@ -35,7 +35,8 @@ class ResourceString {
   ResourceString(const std::wstring& resourceLibrary, const std::wstring& messageId);
 
   const std::wstring& str() const { return text_; }
-  operator const std::wstring&() const { return text_; }
+  // Implicit, as the callers pass a resource string wherever a message text is taken.
+  operator const std::wstring&() const { return text_; }  // NOLINT(google-explicit-constructor)
 
  private:
   std::wstring text_;

@@ -24,7 +24,7 @@ class VNMessageBuffer {
   VNMessageBuffer& operator<<(const char* text);
 
   // The underlying stream, for the standard inserters.
-  operator std::ostream&();
+  operator std::ostream&();  // NOLINT(google-explicit-constructor)
 
   // The collected text of `buffer`; the buffer is emptied and its stream state cleared.
   static std::string str(VNMessageBuffer& buffer);

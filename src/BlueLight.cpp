@@ -182,7 +182,7 @@ unsigned short setVector(std::vector<BlueLight>& lights, Kesta::Instrumentation&
     const std::string pathText = cursor.convertPathToString(path);
     const std::string description = cursor.getNodeDescription();
 
-    if (!light.setDeviceID(description + ":" + pathText)) {
+    if (!light.setDeviceID(std::string(description).append(":").append(pathText))) {
       throw ProviderException("Failed while setting Device ID");
     }
     if (!light.setElementName(description)) {

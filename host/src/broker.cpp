@@ -20,21 +20,22 @@ std::optional<std::vector<std::string>> Broker::classKeys(std::string_view class
   return core_->classKeys(className);
 }
 
-void Broker::setSuperclass(std::string className, std::string superclassName) {
-  core_->setSuperclass(std::move(className), std::move(superclassName));
+void Broker::setSuperclass(const std::string& className, const std::string& superclassName) {
+  core_->setSuperclass(className, superclassName);
 }
 
-void Broker::setUpcallInstances(std::string className, std::vector<InstanceValue> instances) {
+void Broker::setUpcallInstances(const std::string& className,
+                                std::vector<InstanceValue> instances) {
   detail::UpcallAnswer answer;
   answer.instances = std::move(instances);
-  core_->setUpcallAnswer(std::move(className), std::move(answer));
+  core_->setUpcallAnswer(className, std::move(answer));
 }
 
-void Broker::setUpcallFailure(std::string className, StatusValue status) {
+void Broker::setUpcallFailure(const std::string& className, StatusValue status) {
   detail::UpcallAnswer answer;
   answer.fail = true;
   answer.status = std::move(status);
-  core_->setUpcallAnswer(std::move(className), std::move(answer));
+  core_->setUpcallAnswer(className, std::move(answer));
 }
 
 void Broker::clearUpcall(std::string_view className) { core_->clearUpcall(className); }

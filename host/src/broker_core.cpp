@@ -106,7 +106,7 @@ std::optional<std::vector<std::string>> BrokerCore::classKeys(std::string_view c
   return it->second.second;
 }
 
-void BrokerCore::setSuperclass(std::string className, std::string superclass) {
+void BrokerCore::setSuperclass(const std::string& className, const std::string& superclass) {
   std::lock_guard<std::mutex> lock(configMutex_);
   superclasses_[asciiLowerCopy(className)] = asciiLowerCopy(superclass);
 }
@@ -125,7 +125,7 @@ bool BrokerCore::classIsA(std::string_view className, std::string_view type) con
   return false;
 }
 
-void BrokerCore::setUpcallAnswer(std::string className, UpcallAnswer answer) {
+void BrokerCore::setUpcallAnswer(const std::string& className, UpcallAnswer answer) {
   std::lock_guard<std::mutex> lock(configMutex_);
   upcalls_[asciiLowerCopy(className)] = std::move(answer);
 }

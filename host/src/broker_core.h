@@ -83,10 +83,10 @@ class BrokerCore {
 
   void setClassKeys(std::string className, std::vector<std::string> keys);
   std::optional<std::vector<std::string>> classKeys(std::string_view className) const;
-  void setSuperclass(std::string className, std::string superclass);
+  void setSuperclass(const std::string& className, const std::string& superclass);
   bool classIsA(std::string_view className, std::string_view type) const;
 
-  void setUpcallAnswer(std::string className, UpcallAnswer answer);
+  void setUpcallAnswer(const std::string& className, UpcallAnswer answer);
   void clearUpcall(std::string_view className);
   void clearUpcalls();
   /// The configured answer; an empty, successful one for classes with nothing configured.
@@ -131,7 +131,7 @@ class BrokerCore {
   /// A status whose message (when rc is not OK) is a new string in the target scope.
   CMPIStatus makeStatus(CMPIrc rc, const std::string& message);
   /// A status made from a StatusValue the same way.
-  CMPIStatus makeStatus(const StatusValue& status);
+  CMPIStatus makeStatus(const StatusValue& value);
 
  private:
   BrokerOptions options_;

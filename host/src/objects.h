@@ -98,7 +98,9 @@ class StringObject final : public Encapsulated<StringObject, CMPIString, CMPIStr
   static StringObject* ownerOfHandle(void* handle);
 
  private:
-  static constexpr std::size_t kPrefix = sizeof(StringObject*);
+  // The buffer starts with the owner's address, so that a handle leads back to its object.
+  static constexpr std::size_t kPrefix =
+      sizeof(StringObject*);  // NOLINT(bugprone-sizeof-expression)
   std::size_t length_;
   std::unique_ptr<char[]> buffer_;
 };
@@ -269,6 +271,8 @@ class DateTimeObject final : public Encapsulated<DateTimeObject, CMPIDateTime, C
 class GcMark final : public ManagedObject {
  public:
   GcMark(ObjectScope& scope, std::uint64_t sequence);
+  GcMark(const GcMark&) = delete;
+  GcMark& operator=(const GcMark&) = delete;
   ~GcMark() override;
   std::uint64_t sequence() const { return sequence_; }
 

@@ -19,7 +19,7 @@ namespace {
 
 // Only the first line matters; the limit keeps a wrong file (a log, a binary) from being read
 // whole on every operation.
-constexpr std::size_t kConfigurationFileLimit = 64 * 1024;
+constexpr std::size_t kConfigurationFileLimit = std::size_t{64} * 1024;
 
 std::mutex configurationFileMutex;
 std::string configurationFileOverride;  // guarded by configurationFileMutex

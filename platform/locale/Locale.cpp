@@ -25,7 +25,7 @@ namespace {
 
 constexpr const char* kFallbackLanguage = "en";
 // Real catalogues are a few hundred bytes; the limit only keeps a wrong file from being read.
-constexpr std::size_t kCatalogueLimit = 4 * 1024 * 1024;
+constexpr std::size_t kCatalogueLimit = std::size_t{4} * 1024 * 1024;
 // Only a handful of paths are ever looked up; the limit bounds the cache if callers pass many.
 constexpr std::size_t kMaxCachedCatalogues = 64;
 
@@ -190,7 +190,8 @@ std::wstring getResourceLibrary(int kind, const std::string& languageId) {
     const std::string fileName = "/LC_MESSAGES/" + platform::messageDomain() + ".mo";
     for (const std::string& candidate : {language, std::string(platform::kFallbackLanguage)}) {
       for (const std::string& directory : platform::searchedDirectories()) {
-        const std::string path = directory + "/" + candidate + fileName;
+        const std::string path =
+            std::string(directory).append("/").append(candidate).append(fileName);
         if (platform::isRegularFile(path)) {
           return platform::wideFromPath(path);
         }

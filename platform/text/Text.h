@@ -18,7 +18,9 @@ namespace platform {
 // byte compares as it is. It does not depend on the process's locale, which an object manager
 // may set: locale-aware folding (tolower, strcasecmp) would make "I" and "i" differ under a
 // Turkish locale.
-constexpr char asciiLower(char c) noexcept { return c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c; }
+constexpr char asciiLower(char c) noexcept {
+  return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
 // True when the two texts are equal but for the case of A-Z.
 bool equalsIgnoringCase(std::string_view first, std::string_view second) noexcept;
 // `text` with A-Z in lower case, for keys of case-insensitive maps.

@@ -35,9 +35,13 @@ cmpihost::ProviderLibrary& providerLibrary();
 // One test: a fresh broker, the four MIs created on it (in a request, as an object manager
 // does), a fixed system name, and a tree of lights.
 class BlackboxTest : public ::testing::Test {
+ public:
+  BlackboxTest(const BlackboxTest&) = delete;
+  BlackboxTest& operator=(const BlackboxTest&) = delete;
+  ~BlackboxTest() override;
+
  protected:
   BlackboxTest();
-  ~BlackboxTest() override;
 
   // Points the instrumentation at a tree of `nodes` (read at every operation), followed by the
   // other sources of the run, if any.

@@ -96,12 +96,14 @@ std::string nameOf(const ObjectPathValue& path) {
 
 std::vector<std::string> namesOf(const std::vector<ObjectPathValue>& paths) {
   std::vector<std::string> names;
+  names.reserve(paths.size());
   for (const ObjectPathValue& path : paths) names.push_back(nameOf(path));
   return names;
 }
 
 std::vector<std::string> namesOf(const std::vector<InstanceValue>& instances) {
   std::vector<std::string> names;
+  names.reserve(instances.size());
   for (const InstanceValue& instance : instances) names.push_back(nameOf(instance.path()));
   return names;
 }

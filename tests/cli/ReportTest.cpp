@@ -12,7 +12,6 @@ namespace {
 using cmpihost::InstanceValue;
 using cmpihost::ObjectPathValue;
 using cmpihost::ObjectState;
-using cmpihost::ResultEvent;
 using cmpihost::ResultKind;
 using cmpihost::StatusValue;
 using cmpihost::Value;

@@ -29,6 +29,7 @@ class ConcurrencyTest : public ::testing::Test {
     std::atomic<int> mismatches{0};
     std::atomic<bool> go{false};
     std::vector<std::thread> threads;
+    threads.reserve(kThreads);
     for (int t = 0; t < kThreads; ++t) {
       threads.emplace_back([&, t] {
         while (!go.load()) std::this_thread::yield();

@@ -79,7 +79,7 @@ class FakeKernel final : public IpmiDeviceOs {
 
   int open(const char* path, int flags) override {
     std::lock_guard<std::mutex> lock(mutex_);
-    openedPaths.push_back(path);
+    openedPaths.emplace_back(path);
     openFlags.push_back(flags);
     if (openError != 0) {
       return openError;
@@ -179,7 +179,7 @@ class FakeKernel final : public IpmiDeviceOs {
     message.msg.netfn = next.netFn;
     message.msg.cmd = next.command;
     const std::size_t length = std::min<std::size_t>(next.data.size(), message.msg.data_len);
-    std::copy(next.data.begin(), next.data.begin() + length, message.msg.data);
+    std::copy_n(next.data.begin(), length, message.msg.data);
     message.msg.data_len = static_cast<unsigned short>(length);
     return next.result;
   }
@@ -414,6 +414,7 @@ TEST_F(IpmiDeviceTransportTest, ConcurrentReadersEachGetTheirOwnAnswer) {
   const IpmiDeviceTransport transport("/dev/ipmi0", kernel_, clock_);
   std::atomic<int> wrong{0};
   std::vector<std::thread> readers;
+  readers.reserve(8);
   for (int t = 0; t < 8; ++t) {
     readers.emplace_back([&] {
       for (int i = 0; i < 50; ++i) {

@@ -31,6 +31,7 @@ class FakeString {
   }
   FakeString(const FakeString&) = delete;
   FakeString& operator=(const FakeString&) = delete;
+  ~FakeString() = default;
 
   CMPIString* get() { return &object_; }
 
@@ -74,6 +75,7 @@ class FakePath {
   }
   FakePath(const FakePath&) = delete;
   FakePath& operator=(const FakePath&) = delete;
+  ~FakePath() = default;
 
   const CMPIObjectPath* get() const { return &object_; }
   CMPIObjectPath* get() { return &object_; }

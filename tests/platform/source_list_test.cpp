@@ -62,6 +62,7 @@ InstrumentationNode light(const std::string& description, const std::string& pat
 
 std::vector<std::string> pathsOf(const std::vector<InstrumentationNode>& nodes) {
   std::vector<std::string> paths;
+  paths.reserve(nodes.size());
   for (const InstrumentationNode& node : nodes) paths.push_back(node.path);
   return paths;
 }
@@ -72,7 +73,7 @@ std::vector<std::string> pathsOf(const std::vector<InstrumentationNode>& nodes) 
 class AnsweringBmc final : public IpmiDeviceOs {
  public:
   int open(const char* path, int) override {
-    opened.push_back(path);
+    opened.emplace_back(path);
     return 7;
   }
   int close(int) override { return 0; }
@@ -187,7 +188,7 @@ class SourceListWalk : public ::testing::Test {
     return readSourceList(SourceSetting{text, origin}, SourceSystem{}, DiscoveryRoots{});
   }
   std::string tree(const std::string& name, const std::vector<Node>& nodes) {
-    const std::string file = dir_.file(name);
+    std::string file = dir_.file(name);
     writeTree(file, nodes);
     return file;
   }

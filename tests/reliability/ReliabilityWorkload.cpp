@@ -34,7 +34,7 @@ std::vector<testsupport::Node> worldTree() {
 }
 
 std::string writeWorldTree(const testsupport::TempDir& dir) {
-  const std::string file = dir.file("tree.json");
+  std::string file = dir.file("tree.json");
   testsupport::writeTree(file, worldTree());
   return file;
 }
@@ -330,7 +330,9 @@ double now() {
 double cpuSeconds() {
   rusage usage{};
   ::getrusage(RUSAGE_SELF, &usage);
-  auto seconds = [](const timeval& t) { return t.tv_sec + t.tv_usec / 1e6; };
+  auto seconds = [](const timeval& t) {
+    return static_cast<double>(t.tv_sec) + static_cast<double>(t.tv_usec) / 1e6;
+  };
   return seconds(usage.ru_utime) + seconds(usage.ru_stime);
 }
 

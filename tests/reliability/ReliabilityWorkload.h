@@ -58,6 +58,7 @@ class World {
   World();
   World(const World&) = delete;
   World& operator=(const World&) = delete;
+  ~World() = default;
 
   // Answers the computer-system up-calls of `broker` with the two systems.
   static void configure(cmpihost::Broker& broker);

@@ -74,7 +74,7 @@ class Broker {
   std::optional<std::vector<std::string>> classKeys(std::string_view className) const;
   /// Declares a superclass, for CMPIBrokerEncFT.classPathIsA (which otherwise only knows that a
   /// class is itself).
-  void setSuperclass(std::string className, std::string superclassName);
+  void setSuperclass(const std::string& className, const std::string& superclassName);
 
   // ---- Up-calls ---------------------------------------------------------------------------
 
@@ -83,10 +83,10 @@ class Broker {
   /// passed; instances whose path has no keys get them from their key properties (see
   /// setClassKeys). A property list given to CBEnumInstances keeps the listed properties and the
   /// key properties. Replaces an earlier answer or failure for the class.
-  void setUpcallInstances(std::string className, std::vector<InstanceValue> instances);
+  void setUpcallInstances(const std::string& className, std::vector<InstanceValue> instances);
   /// Makes both enumeration up-calls of `className` fail: they return null and set *rc to
   /// `status`.
-  void setUpcallFailure(std::string className, StatusValue status);
+  void setUpcallFailure(const std::string& className, StatusValue status);
   /// Forgets what was configured for the class. Up-calls of classes with nothing configured
   /// return an empty enumeration with CMPI_RC_OK.
   void clearUpcall(std::string_view className);

@@ -21,7 +21,8 @@ struct StatusValue {
 
   StatusValue() = default;
   // Implicit on purpose: StatusValue{CMPI_RC_ERR_FAILED, "text"} and plain codes read naturally.
-  StatusValue(CMPIrc code, std::optional<std::string> text = std::nullopt);
+  StatusValue(CMPIrc code,  // NOLINT(google-explicit-constructor)
+              std::optional<std::string> text = std::nullopt);
 
   bool ok() const { return rc == CMPI_RC_OK; }
 

@@ -19,6 +19,9 @@ extern "C" {
 // The symbol the platform looks up in the transport.
 #define BLUELIGHT_IPMI_LAN_ENTRY_POINT "bluelight_ipmi_lan_api"
 
+// The interface is C, so that the transport can be built with any compiler: typedef, not using.
+// NOLINTBEGIN(modernize-use-using)
+
 // Where and how to open a session. Everything is read during the call only.
 typedef struct BluelightIpmiLanTarget {
   const char* host;  // host name or address, NUL-terminated (IPv6 without brackets)
@@ -60,6 +63,8 @@ typedef struct BluelightIpmiLanApi {
 } BluelightIpmiLanApi;
 
 typedef const BluelightIpmiLanApi* (*BluelightIpmiLanEntryPoint)(void);
+
+// NOLINTEND(modernize-use-using)
 
 #ifdef __cplusplus
 }

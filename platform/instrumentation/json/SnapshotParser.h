@@ -12,7 +12,7 @@ namespace Kesta {
 namespace platform {
 
 // The largest snapshot that is read. A tree of a million nodes stays well below it.
-constexpr std::size_t kJsonSnapshotLimit = 256 * 1024 * 1024;
+constexpr std::size_t kJsonSnapshotLimit = std::size_t{256} * 1024 * 1024;
 
 // The nodes of a snapshot text:
 //   {"nodes": [{"type": 26, "path": "1.2", "description": "Blue Light", "status": 1,

@@ -50,7 +50,7 @@ std::string simulatorExecutable() {
   std::size_t start = 0;
   while (start <= directories.size()) {
     const std::size_t end = std::min(directories.find(':', start), directories.size());
-    const std::string candidate = directories.substr(start, end - start) + "/ipmi_sim";
+    std::string candidate = directories.substr(start, end - start) + "/ipmi_sim";
     if (end > start && isExecutable(candidate)) {
       return candidate;
     }
@@ -160,7 +160,7 @@ double medianMicroseconds(std::vector<std::chrono::nanoseconds> samples) {
   return (lower + upper) / 2.0 / 1000.0;
 }
 
-IpmiSimulator::IpmiSimulator(SimulatorOptions options)
+IpmiSimulator::IpmiSimulator(const SimulatorOptions& options)
     : readerCredentials_(dir_.file("reader.conf")),
       keeperCredentials_(dir_.file("keeper.conf")),
       outputFile_(dir_.file("ipmi_sim.out")) {
@@ -201,6 +201,7 @@ bool IpmiSimulator::startOnce(const SimulatorOptions& options, std::string& why)
   // Everything the child needs is ready before fork: it may only make async-signal-safe calls.
   std::vector<std::string> arguments = {executable, "-c", lanConf, "-f", emu, "-s", state, "-n"};
   std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) {
     argv.push_back(argument.data());
   }

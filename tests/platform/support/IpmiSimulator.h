@@ -51,7 +51,7 @@ class IpmiSimulator {
  public:
   // Starts the simulator and waits until it answers an RMCP ping; throws std::runtime_error
   // with the simulator's output when it does not come up.
-  explicit IpmiSimulator(SimulatorOptions options = {});
+  explicit IpmiSimulator(const SimulatorOptions& options = {});
   ~IpmiSimulator();
   IpmiSimulator(const IpmiSimulator&) = delete;
   IpmiSimulator& operator=(const IpmiSimulator&) = delete;
