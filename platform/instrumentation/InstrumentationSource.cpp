@@ -8,6 +8,7 @@
 #include "instrumentation/ipmi/IpmiSource.h"
 #include "instrumentation/json/JsonFileSource.h"
 #include "instrumentation/leds/SysfsLedSource.h"
+#include "instrumentation/redfish/RedfishSource.h"
 #include "os/FileIo.h"
 #include "text/Text.h"
 
@@ -59,9 +60,12 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
   if (colon != std::string_view::npos && (scheme == "ipmi" || scheme == "ipmi-lan")) {
     return makeIpmiSource(text);
   }
+  if (colon != std::string_view::npos && scheme == "redfish") {
+    return makeRedfishSource(text);
+  }
   throw SourceError(
-      "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
-      "ipmi-lan:<host>?credentials=<file>)");
+      "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>], "
+      "ipmi-lan:<host>?credentials=<file> or redfish:https://<host>?credentials=<file>)");
 }
 
 SourceSetting configuredSource(FileSystem& files) {
