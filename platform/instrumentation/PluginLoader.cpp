@@ -23,29 +23,29 @@ bool exists(const std::string& path) {
 }
 
 // Loads the plug-in at `path`; returns its table, or null with `why` filled in.
-const void* load(const std::string& path, const PluginSpec& spec, std::string& why) {
+const void* load(const std::string& path, const PluginDescription& plugin, std::string& why) {
   ::dlerror();
   void* handle = ::dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
   if (handle == nullptr) {
     const char* error = ::dlerror();
-    why = std::string(spec.what) + " \"" + printable(path) + "\" cannot be loaded: " +
+    why = std::string(plugin.what) + " \"" + printable(path) + "\" cannot be loaded: " +
           (error != nullptr ? printable(error) : std::string("unknown error")) + " (" +
-          spec.runtimeHint + ")";
+          plugin.runtimeHint + ")";
     return nullptr;
   }
-  const auto entry = reinterpret_cast<EntryPoint>(::dlsym(handle, spec.entryPoint));
+  const auto entry = reinterpret_cast<EntryPoint>(::dlsym(handle, plugin.entryPoint));
   const void* table = entry != nullptr ? entry() : nullptr;
-  if (table == nullptr || (spec.complete != nullptr && !spec.complete(table))) {
-    why = "\"" + printable(path) + "\" is not " + spec.what + " (no " + spec.entryPoint + ")";
+  if (table == nullptr || (plugin.complete != nullptr && !plugin.complete(table))) {
+    why = "\"" + printable(path) + "\" is not " + plugin.what + " (no " + plugin.entryPoint + ")";
     ::dlclose(handle);
     return nullptr;
   }
   // Every table starts with its version.
   const unsigned int version = *static_cast<const unsigned int*>(table);
-  if (version != spec.abiVersion) {
-    why = std::string(spec.what) + " \"" + printable(path) + "\" is of version " +
+  if (version != plugin.abiVersion) {
+    why = std::string(plugin.what) + " \"" + printable(path) + "\" is of version " +
           std::to_string(version) + ", but this provider needs version " +
-          std::to_string(spec.abiVersion);
+          std::to_string(plugin.abiVersion);
     ::dlclose(handle);
     return nullptr;
   }
@@ -56,7 +56,7 @@ const void* load(const std::string& path, const PluginSpec& spec, std::string& w
 }  // namespace
 
 std::vector<std::string> pluginCandidates(const std::string& binaryDirectory,
-                                          const PluginSpec& spec) {
+                                          const PluginDescription& plugin) {
   std::vector<std::string> candidates;
   const auto add = [&candidates](const std::filesystem::path& path) {
     std::string normal = path.lexically_normal().string();
@@ -66,21 +66,21 @@ std::vector<std::string> pluginCandidates(const std::string& binaryDirectory,
   };
   if (!binaryDirectory.empty()) {
     const std::filesystem::path binary(binaryDirectory);
-    add(binary / spec.folder / spec.file);
-    add(binary / ".." / "lib" / spec.folder / spec.file);
+    add(binary / plugin.folder / plugin.file);
+    add(binary / ".." / "lib" / plugin.folder / plugin.file);
   }
-  add(std::filesystem::path(spec.installDir) / spec.file);
+  add(std::filesystem::path(plugin.installDir) / plugin.file);
   return candidates;
 }
 
-const void* loadPlugin(const PluginSpec& spec) {
-  const std::vector<std::string> candidates = pluginCandidates(ownBinaryDirectory(), spec);
+const void* loadPlugin(const PluginDescription& plugin) {
+  const std::vector<std::string> candidates = pluginCandidates(ownBinaryDirectory(), plugin);
   for (const std::string& candidate : candidates) {
     if (!exists(candidate)) {
       continue;
     }
     std::string why;
-    const void* table = load(candidate, spec, why);
+    const void* table = load(candidate, plugin, why);
     if (table == nullptr) {
       throw SourceError(why);
     }
@@ -90,10 +90,10 @@ const void* loadPlugin(const PluginSpec& spec) {
   for (const std::string& candidate : candidates) {
     looked += (looked.empty() ? "" : ", ") + printable(candidate);
   }
-  if (!spec.built) {
-    throw SourceError(std::string(spec.notBuilt) + "; looked in " + looked);
+  if (!plugin.built) {
+    throw SourceError(std::string(plugin.notBuilt) + "; looked in " + looked);
   }
-  throw SourceError(std::string(spec.what) + " " + spec.file + " is not installed (looked in " +
+  throw SourceError(std::string(plugin.what) + " " + plugin.file + " is not installed (looked in " +
                     looked + ")");
 }
 

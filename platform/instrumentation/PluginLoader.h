@@ -18,7 +18,7 @@ namespace Kesta {
 namespace platform {
 
 // What the loader needs to know of one plug-in, and the words its messages use.
-struct PluginSpec {
+struct PluginDescription {
   const char* file = "";        // "bluelight-ipmi-lan.so"
   const char* folder = "";      // the folder it sits in next to the provider library
   const char* installDir = "";  // that folder in an installation (under the libdir), looked in last
@@ -38,13 +38,13 @@ struct PluginSpec {
 //   <binaryDirectory>/../lib/<folder>/<file>       (build-tree programs in build/bin)
 //   <installDir>/<file>
 std::vector<std::string> pluginCandidates(const std::string& binaryDirectory,
-                                          const PluginSpec& spec);
+                                          const PluginDescription& plugin);
 
 // Loads the first candidate that exists (for the directory of this binary) and returns its table.
 // The first file found decides: loading a second, older copy instead would hide the problem.
 // Throws SourceError, saying where it looked, when the plug-in is missing, cannot be loaded, is
 // not the plug-in or is of another version. Not cached: callers keep the table they got.
-const void* loadPlugin(const PluginSpec& spec);
+const void* loadPlugin(const PluginDescription& plugin);
 
 }  // namespace platform
 }  // namespace Kesta

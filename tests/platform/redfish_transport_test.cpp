@@ -348,7 +348,10 @@ TEST(RedfishPlugin, LoadsFromBesideTheProgramWithItsVersion) {
   }
   const BluelightRedfishApi& api = redfishPlugin();
   EXPECT_EQ(api.abiVersion, BLUELIGHT_REDFISH_ABI_VERSION);
-  EXPECT_EQ(&redfishPlugin(), &api) << "loaded once";
+  EXPECT_EQ(&redfishPlugin(), &api) << "the library is loaded once";
+  Kesta::platform::RedfishPluginCache cache;
+  EXPECT_EQ(&cache.get(), &api);
+  EXPECT_EQ(&cache.get(), &api);
   char reason[BLUELIGHT_REDFISH_MAX_REASON] = {};
   EXPECT_EQ(api.open(nullptr, reason, sizeof reason), nullptr);
   EXPECT_STREQ(reason, "no service was named");

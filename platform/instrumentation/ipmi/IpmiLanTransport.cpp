@@ -21,34 +21,34 @@ bool isComplete(const void* table) {
   return static_cast<const BluelightIpmiLanApi*>(table)->transact != nullptr;
 }
 
-PluginSpec ipmiLanPluginSpec() {
-  PluginSpec spec;
-  spec.file = BLUELIGHT_IPMI_LAN_PLUGIN_FILE;
-  spec.folder = BLUELIGHT_IPMI_LAN_PLUGIN_FOLDER;
-  spec.installDir = BLUELIGHT_IPMI_LAN_PLUGIN_INSTALL_DIR;
-  spec.built = BLUELIGHT_IPMI_LAN_PLUGIN_BUILT != 0;
-  spec.entryPoint = BLUELIGHT_IPMI_LAN_ENTRY_POINT;
-  spec.abiVersion = BLUELIGHT_IPMI_LAN_ABI_VERSION;
-  spec.what = "the network transport";
-  spec.runtimeHint = "it needs OpenIPMI's libraries: Debian package libopenipmi0";
-  spec.notBuilt =
+PluginDescription ipmiLanPluginDescription() {
+  PluginDescription plugin;
+  plugin.file = BLUELIGHT_IPMI_LAN_PLUGIN_FILE;
+  plugin.folder = BLUELIGHT_IPMI_LAN_PLUGIN_FOLDER;
+  plugin.installDir = BLUELIGHT_IPMI_LAN_PLUGIN_INSTALL_DIR;
+  plugin.built = BLUELIGHT_IPMI_LAN_PLUGIN_BUILT != 0;
+  plugin.entryPoint = BLUELIGHT_IPMI_LAN_ENTRY_POINT;
+  plugin.abiVersion = BLUELIGHT_IPMI_LAN_ABI_VERSION;
+  plugin.what = "the network transport";
+  plugin.runtimeHint = "it needs OpenIPMI's libraries: Debian package libopenipmi0";
+  plugin.notBuilt =
       "this build has no network transport for ipmi-lan: sources (OpenIPMI was not found when it "
       "was configured)";
-  spec.complete = isComplete;
-  return spec;
+  plugin.complete = isComplete;
+  return plugin;
 }
 
 }  // namespace
 
 std::vector<std::string> ipmiLanPluginCandidates(const std::string& binaryDirectory) {
-  return pluginCandidates(binaryDirectory, ipmiLanPluginSpec());
+  return pluginCandidates(binaryDirectory, ipmiLanPluginDescription());
 }
 
 // Never unloaded (as no plug-in is): this one runs a thread that holds the BMC sessions.
 const BluelightIpmiLanApi& ipmiLanPlugin() {
   std::lock_guard<std::mutex> lock(pluginMutex);
   if (loadedPlugin == nullptr) {
-    loadedPlugin = static_cast<const BluelightIpmiLanApi*>(loadPlugin(ipmiLanPluginSpec()));
+    loadedPlugin = static_cast<const BluelightIpmiLanApi*>(loadPlugin(ipmiLanPluginDescription()));
   }
   return *loadedPlugin;
 }

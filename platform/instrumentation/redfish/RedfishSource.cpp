@@ -145,7 +145,8 @@ std::string redfishPathPrefix(const RedfishSourceSettings& settings) {
 
 RedfishSessionFactory redfishSessionFactory(const RedfishSourceSettings& settings,
                                             const RedfishSourceSystem& system) {
-  return [settings, files = system.files, clock = system.clock]() {
+  return [settings, files = system.files, clock = system.clock,
+          plugin = std::make_shared<RedfishPluginCache>()]() {
     RedfishTarget target;
     target.host = settings.host;
     target.port = settings.port;
@@ -155,7 +156,7 @@ RedfishSessionFactory redfishSessionFactory(const RedfishSourceSettings& setting
     if (!target.caFile.empty()) {
       checkCaFile(target.caFile, *files);
     }
-    return openRedfishSession(redfishPlugin(), target, clock);
+    return openRedfishSession(plugin->get(), target, clock);
   };
 }
 

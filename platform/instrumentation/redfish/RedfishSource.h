@@ -71,7 +71,8 @@ struct RedfishSourceSystem {
 using RedfishSessionFactory = std::function<std::unique_ptr<RedfishSession>()>;
 
 // The sessions makeRedfishSource gives its source: the credentials file read afresh, the ca= file
-// checked, the transport plug-in loaded, one session opened. Tests wrap it to watch the sessions.
+// checked, the transport plug-in loaded (at the first walk; RedfishPluginCache), one session
+// opened. Tests wrap it to watch the sessions.
 RedfishSessionFactory redfishSessionFactory(const RedfishSourceSettings& settings,
                                             const RedfishSourceSystem& system);
 

@@ -16,30 +16,27 @@ namespace {
 
 constexpr unsigned int kHttpsPort = 443;
 
-std::mutex pluginMutex;
-const BluelightRedfishApi* loadedPlugin = nullptr;  // guarded by pluginMutex; never unloaded
-
 bool isComplete(const void* table) {
   const auto* api = static_cast<const BluelightRedfishApi*>(table);
   return api->open != nullptr && api->get != nullptr && api->connections != nullptr &&
          api->close != nullptr;
 }
 
-PluginSpec redfishPluginSpec() {
-  PluginSpec spec;
-  spec.file = BLUELIGHT_REDFISH_PLUGIN_FILE;
-  spec.folder = BLUELIGHT_REDFISH_PLUGIN_FOLDER;
-  spec.installDir = BLUELIGHT_REDFISH_PLUGIN_INSTALL_DIR;
-  spec.built = BLUELIGHT_REDFISH_PLUGIN_BUILT != 0;
-  spec.entryPoint = BLUELIGHT_REDFISH_ENTRY_POINT;
-  spec.abiVersion = BLUELIGHT_REDFISH_ABI_VERSION;
-  spec.what = "the Redfish transport";
-  spec.runtimeHint = "it needs libcurl: Debian package libcurl4";
-  spec.notBuilt =
+PluginDescription redfishPluginDescription() {
+  PluginDescription plugin;
+  plugin.file = BLUELIGHT_REDFISH_PLUGIN_FILE;
+  plugin.folder = BLUELIGHT_REDFISH_PLUGIN_FOLDER;
+  plugin.installDir = BLUELIGHT_REDFISH_PLUGIN_INSTALL_DIR;
+  plugin.built = BLUELIGHT_REDFISH_PLUGIN_BUILT != 0;
+  plugin.entryPoint = BLUELIGHT_REDFISH_ENTRY_POINT;
+  plugin.abiVersion = BLUELIGHT_REDFISH_ABI_VERSION;
+  plugin.what = "the Redfish transport";
+  plugin.runtimeHint = "it needs libcurl: Debian package libcurl4";
+  plugin.notBuilt =
       "this build has no transport for redfish: sources (libcurl was not found when it was "
       "configured)";
-  spec.complete = isComplete;
-  return spec;
+  plugin.complete = isComplete;
+  return plugin;
 }
 
 int appendBody(void* context, const char* bytes, unsigned long length) {
@@ -142,15 +139,19 @@ class PluginSession final : public RedfishSession {
 }  // namespace
 
 std::vector<std::string> redfishPluginCandidates(const std::string& binaryDirectory) {
-  return pluginCandidates(binaryDirectory, redfishPluginSpec());
+  return pluginCandidates(binaryDirectory, redfishPluginDescription());
 }
 
 const BluelightRedfishApi& redfishPlugin() {
-  std::lock_guard<std::mutex> lock(pluginMutex);
-  if (loadedPlugin == nullptr) {
-    loadedPlugin = static_cast<const BluelightRedfishApi*>(loadPlugin(redfishPluginSpec()));
+  return *static_cast<const BluelightRedfishApi*>(loadPlugin(redfishPluginDescription()));
+}
+
+const BluelightRedfishApi& RedfishPluginCache::get() {
+  std::lock_guard<std::mutex> lock(mutex_);
+  if (api_ == nullptr) {
+    api_ = &redfishPlugin();
   }
-  return *loadedPlugin;
+  return *api_;
 }
 
 RedirectTarget sameServiceRedirect(std::string_view location, const std::string& host,

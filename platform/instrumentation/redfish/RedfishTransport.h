@@ -9,6 +9,7 @@
 
 #include <cstddef>
 #include <memory>
+#include <mutex>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -33,9 +34,23 @@ constexpr unsigned int kRedfishMaxRedirects = 3;
 //   <CMAKE_INSTALL_FULL_LIBDIR>/bluelightprofileprovider/bluelight-redfish.so
 std::vector<std::string> redfishPluginCandidates(const std::string& binaryDirectory);
 
-// The plug-in's entry points, loaded once per process and never unloaded. Throws SourceError,
-// saying where it looked, when it is missing or unusable; a later call tries again.
+// The plug-in's entry points. The plug-in is never unloaded, and one that is loaded already is
+// not loaded again: the dynamic loader hands back the same library, so every call gives the same
+// table. Throws SourceError, saying where it looked, when it is missing or unusable.
 const BluelightRedfishApi& redfishPlugin();
+
+// The plug-in as one source keeps it between its walks: looked for at the first walk only, and
+// again at the next walk when it could not be loaded. Each source has its own, so nothing about
+// the plug-in is kept in a global of the platform. Safe to use from several threads.
+class RedfishPluginCache {
+ public:
+  // redfishPlugin(), the first time it succeeds; the same table afterwards.
+  const BluelightRedfishApi& get();
+
+ private:
+  std::mutex mutex_;
+  const BluelightRedfishApi* api_ = nullptr;  // guarded by mutex_
+};
 
 // The service a session talks to.
 struct RedfishTarget {
