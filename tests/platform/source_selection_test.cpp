@@ -102,8 +102,8 @@ TEST_F(SourceSelection, UnknownSchemeIsLoggedAndThrown) {
   ScopedEnv source("KESTA_INSTRUMENTATION", "http:bmc0");
   EXPECT_EQ(failureText(),
             "Instrumentation source \"http:bmc0\" (from KESTA_INSTRUMENTATION) cannot be read: "
-            "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>] or "
-            "ipmi-lan:<host>?credentials=<file>)");
+            "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>], "
+            "ipmi-lan:<host>?credentials=<file> or redfish:https://<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, TextWithoutSchemeIsLoggedAndThrown) {
@@ -111,7 +111,8 @@ TEST_F(SourceSelection, TextWithoutSchemeIsLoggedAndThrown) {
   EXPECT_EQ(failureText(),
             "Instrumentation source \"/var/lib/tree.json\" (from KESTA_INSTRUMENTATION) cannot be "
             "read: unknown kind of source (expected file:<path>, sysfs:<directory>, "
-            "ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
+            "ipmi:[<device>], ipmi-lan:<host>?credentials=<file> or "
+            "redfish:https://<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, FileWithoutPathIsLoggedAndThrown) {
