@@ -50,6 +50,7 @@ std::string readText(const std::string& file) {
 // Starts `arguments` with its output going to `output`; the child dies with this process.
 pid_t start(std::vector<std::string> arguments, const std::string& output) {
   std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) {
     argv.push_back(argument.data());
   }

@@ -25,7 +25,6 @@ using Kesta::platform::InstrumentationNode;
 using Kesta::platform::InstrumentationSource;
 using Kesta::platform::makeRedfishSource;
 using Kesta::platform::SourceError;
-using redfish_test::MockOptions;
 using redfish_test::RedfishMock;
 using testsupport::LogCapture;
 
@@ -67,6 +66,7 @@ class RedfishMockTest : public ::testing::Test {
 
   static std::vector<std::string> paths(const std::vector<InstrumentationNode>& nodes) {
     std::vector<std::string> result;
+    result.reserve(nodes.size());
     for (const InstrumentationNode& node : nodes) {
       result.push_back(node.path);
     }

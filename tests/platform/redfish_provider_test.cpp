@@ -16,7 +16,6 @@
 
 namespace {
 
-using redfish_test::MockOptions;
 using redfish_test::RedfishMock;
 using testsupport::LogCapture;
 using testsupport::ScopedEnv;

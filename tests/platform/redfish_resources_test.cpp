@@ -13,7 +13,6 @@ namespace {
 
 using Kesta::platform::InstrumentationNode;
 using Kesta::platform::isRedfishServicePath;
-using Kesta::platform::NodeProperty;
 using Kesta::platform::OnReport;
 using Kesta::platform::readRedfishChassis;
 using Kesta::platform::readRedfishCollection;

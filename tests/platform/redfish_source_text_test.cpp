@@ -221,7 +221,7 @@ TEST(RedfishCredentialsFormat, RefusesWhatItCannotUse) {
   EXPECT_EQ(credentialsRefusal("user=a\npassword=b\npassword=c"),
             prefix + "line 3: \"password\" is given twice");
   EXPECT_EQ(credentialsRefusal("user=a\ns3cret\n"), prefix + "line 2 is not \"name = value\"");
-  EXPECT_EQ(credentialsRefusal(std::string("user=a\npassword=b\0c", 20)),
+  EXPECT_EQ(credentialsRefusal(std::string("user=a\npassword=b\0c", 19)),
             prefix + "line 2: the value holds a NUL character");
 }
 

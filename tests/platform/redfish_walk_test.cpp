@@ -215,9 +215,8 @@ TEST(RedfishWalk, WrongValuesGiveUnreadableLightsAndOneLineEach) {
   EXPECT_EQ(
       result.problems,
       (std::vector<std::string>{
-          "cannot read the identify light of /redfish/v1/Chassis/Purple: IndicatorLED is the "
-          "string "
-          "\"Purple\", not \"Lit\", \"Blinking\", \"Off\" or null",
+          std::string("cannot read the identify light of /redfish/v1/Chassis/Purple: ") +
+              "IndicatorLED is the string \"Purple\", not \"Lit\", \"Blinking\", \"Off\" or null",
           "cannot read the identify light of /redfish/v1/Chassis/Yes: LocationIndicatorActive is "
           "the string \"yes\", not true, false or null",
           "cannot read the identify light of /redfish/v1/Chassis/Sick: Status.Health is the string "

@@ -26,7 +26,7 @@ constexpr int kFailureLevel = 6000;
 
 // A file of certificate authorities is read only to see that it can be; the system's own bundle is
 // a few hundred kilobytes, so anything far bigger is the wrong file.
-constexpr std::size_t kCaFileLimit = 16 * 1024 * 1024;
+constexpr std::size_t kCaFileLimit = std::size_t{16} * 1024 * 1024;
 
 void logLine(const std::string& source, const std::string& text) {
   VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,

@@ -24,7 +24,7 @@ namespace platform {
 
 // The largest answer read for one resource. A chassis or drive is a few kilobytes; a collection
 // of a thousand members some tens.
-constexpr std::size_t kRedfishAnswerLimit = 1024 * 1024;
+constexpr std::size_t kRedfishAnswerLimit = std::size_t{1024} * 1024;
 // Redirections followed in a row for one resource (same service only).
 constexpr unsigned int kRedfishMaxRedirects = 3;
 

@@ -42,6 +42,7 @@ bool exists(const std::string& path) {
 // Runs a program to its end with its output going to `output`; its exit status, or -1.
 int run(std::vector<std::string> arguments, const std::string& output) {
   std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) {
     argv.push_back(argument.data());
   }
@@ -155,7 +156,7 @@ void writePrivateFile(const std::string& file, const std::string& text) {
   }
 }
 
-RedfishMock::RedfishMock(MockOptions options)
+RedfishMock::RedfishMock(const MockOptions& options)
     : credentials_(dir_.file("reader.conf")),
       wrongCredentials_(dir_.file("wrong.conf")),
       eventsFile_(dir_.file("events.log")),
@@ -179,11 +180,12 @@ RedfishMock::RedfishMock(MockOptions options)
       "--events",
       eventsFile_};
   for (const std::string& behaviour : options.behaviours) {
-    arguments.push_back("--behave");
+    arguments.emplace_back("--behave");
     arguments.push_back(behaviour);
   }
   // Everything the child needs is ready before fork: it may only make async-signal-safe calls.
   std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) {
     argv.push_back(argument.data());
   }

@@ -66,7 +66,7 @@ class RedfishMock {
  public:
   // Starts the mock and waits until it listens; throws std::runtime_error with its output when it
   // does not come up within 10 s.
-  explicit RedfishMock(MockOptions options = {});
+  explicit RedfishMock(const MockOptions& options = {});
   ~RedfishMock();
   RedfishMock(const RedfishMock&) = delete;
   RedfishMock& operator=(const RedfishMock&) = delete;
