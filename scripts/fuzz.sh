@@ -38,7 +38,7 @@ done
 
 echo "== configuring $build"
 CC=clang CXX=clang++ cmake -S "$root" -B "$build" -DCMAKE_BUILD_TYPE=Debug \
-  -DBLUELIGHT_FUZZ=ON -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF -DBLUELIGHT_IPMI_LAN=OFF >/dev/null
+  -DBLUELIGHT_FUZZ=ON -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF -DBLUELIGHT_IPMI_LAN=OFF -DBLUELIGHT_REDFISH=OFF >/dev/null
 echo "== building ${targets[*]}"
 cmake --build "$build" --target "${targets[@]}" -j "$jobs"
 

@@ -9,6 +9,7 @@
 #include "instrumentation/ipmi/IpmiSource.h"
 #include "instrumentation/json/JsonFileSource.h"
 #include "instrumentation/leds/SysfsLedSource.h"
+#include "instrumentation/redfish/RedfishSource.h"
 #include "os/FileIo.h"
 #include "text/Text.h"
 
@@ -63,9 +64,13 @@ std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_vie
   if (colon != std::string_view::npos && (scheme == "ipmi" || scheme == "ipmi-lan")) {
     return makeIpmiSource(text, IpmiSourceSystem{system.clock, system.files, system.ipmiDevice});
   }
+  if (colon != std::string_view::npos && scheme == "redfish") {
+    return makeRedfishSource(text);
+  }
   throw SourceError(
       "unknown kind of source (expected file:<path>, sysfs:<directory>, enclosure:[<directory>], "
-      "ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
+      "ipmi:[<device>], ipmi-lan:<host>?credentials=<file> or "
+      "redfish:https://<host>?credentials=<file>)");
 }
 
 std::unique_ptr<InstrumentationSource> makeInstrumentationSource(std::string_view text) {

@@ -39,6 +39,14 @@ std::string percentDecoded(std::string_view value, std::string_view name) {
   return decoded;
 }
 
+bool isHostNameCharacter(char c) {
+  return isDigit(c) || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '-' || c == '.' ||
+         c == '_';
+}
+
+// Inside brackets: hexadecimal groups, dots of an embedded IPv4 address and a zone after '%'.
+bool isBracketedAddressCharacter(char c) { return isHostNameCharacter(c) || c == ':' || c == '%'; }
+
 // "250 ms", or "60 s" for whole seconds, as the range of a duration option is written.
 std::string durationText(std::chrono::milliseconds duration) {
   if (duration.count() % 1000 == 0) {
@@ -163,6 +171,61 @@ unsigned int parsePortText(std::string_view text) {
     throw SourceError("the port \"" + printable(text) + "\" is not a number from 1 to 65535");
   }
   return static_cast<unsigned int>(port);
+}
+
+HostAndPort parseHostAndPort(std::string_view where, std::string_view scheme,
+                             std::string_view ipv6Example) {
+  if (where.empty()) {
+    throw SourceError("no host is named after \"" + std::string(scheme) + "\"");
+  }
+  std::string_view host;
+  std::string_view port;
+  if (where.front() == '[') {
+    const std::string_view::size_type close = where.find(']');
+    if (close == std::string_view::npos) {
+      throw SourceError("the address \"" + printable(where) + "\" has no closing ']'");
+    }
+    host = where.substr(1, close - 1);
+    const std::string_view after = where.substr(close + 1);
+    if (!after.empty()) {
+      if (after.front() != ':') {
+        throw SourceError("only \":<port>\" may follow the address in brackets");
+      }
+      port = after.substr(1);
+      if (port.empty()) {
+        throw SourceError("no port follows the ':' after the address");
+      }
+    }
+    if (host.find(':') == std::string_view::npos ||
+        !std::all_of(host.begin(), host.end(), isBracketedAddressCharacter)) {
+      throw SourceError("\"" + printable(host) + "\" in brackets is not an IPv6 address");
+    }
+  } else {
+    const std::string_view::size_type colon = where.find(':');
+    if (colon != std::string_view::npos && where.find(':', colon + 1) != std::string_view::npos) {
+      throw SourceError("an IPv6 address is written in brackets, e.g. " + std::string(ipv6Example));
+    }
+    host = where.substr(0, colon);
+    if (colon != std::string_view::npos) {
+      port = where.substr(colon + 1);
+      if (port.empty()) {
+        throw SourceError("no port follows the ':' after the host");
+      }
+    }
+    if (host.empty() || !std::all_of(host.begin(), host.end(), isHostNameCharacter)) {
+      throw SourceError("\"" + printable(host) + "\" is not a host name or IPv4 address");
+    }
+  }
+  HostAndPort parsed;
+  parsed.host = asciiLowerCopy(host);
+  if (!port.empty()) {
+    parsed.port = parsePortText(port);
+  }
+  return parsed;
+}
+
+std::string bracketedHost(const std::string& host) {
+  return host.find(':') != std::string::npos ? "[" + host + "]" : host;
 }
 
 }  // namespace platform

@@ -7,6 +7,7 @@
 
 #include <chrono>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -43,6 +44,20 @@ std::string parseDescriptionOption(const std::string& text);
 
 // A port number from 1 to 65535, written in decimal.
 unsigned int parsePortText(std::string_view text);
+
+// "<host>[:<port>]": a host name or IPv4 address (letters, digits, '-', '.', '_'), or an IPv6
+// address in brackets, e.g. "[fd00::5]:623", with an optional port.
+struct HostAndPort {
+  std::string host;  // in lower case; an IPv6 address without the brackets
+  std::optional<unsigned int> port;
+};
+// `scheme` ("ipmi-lan:") and `ipv6Example` ("ipmi-lan:[fd00::5]:623") name the source in the
+// messages.
+HostAndPort parseHostAndPort(std::string_view where, std::string_view scheme,
+                             std::string_view ipv6Example);
+
+// The host as addresses and paths write it: an IPv6 address in brackets.
+std::string bracketedHost(const std::string& host);
 
 }  // namespace platform
 }  // namespace Kesta

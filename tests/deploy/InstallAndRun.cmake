@@ -30,7 +30,7 @@ set(prefix ${WORK}/prefix)
 if(PROVIDER_DIR)
   set(build ${WORK}/build)
   run(${CMAKE_COMMAND} -S ${SOURCE_DIR} -B ${build} -DCMAKE_BUILD_TYPE=Debug
-      -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF -DBLUELIGHT_IPMI_LAN=OFF
+      -DBLUELIGHT_BUILD_TESTS=OFF -DBLUELIGHT_BUILD_BENCHMARKS=OFF -DBLUELIGHT_IPMI_LAN=OFF -DBLUELIGHT_REDFISH=OFF
       -DCMAKE_INSTALL_PREFIX=${WORK}/configured-prefix -DBLUELIGHT_PROVIDER_DIR=${PROVIDER_DIR})
   # Only what is installed: the libraries, the tool and the catalogues.
   run(${CMAKE_COMMAND} --build ${build} -j 2 --target bluelightprofileprovider bluelight-cli

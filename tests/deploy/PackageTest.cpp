@@ -127,6 +127,10 @@ std::set<std::string> expectedFiles() {
   // The network transport of the IPMI source, in builds that have it.
   files.insert(BLUELIGHT_DEPLOY_IPMI_LAN_PLUGIN);
 #endif
+#ifdef BLUELIGHT_DEPLOY_REDFISH_PLUGIN
+  // The HTTPS transport of the Redfish source, in builds that have it.
+  files.insert(BLUELIGHT_DEPLOY_REDFISH_PLUGIN);
+#endif
   for (const std::string& doc : deploy::splitList(BLUELIGHT_DEPLOY_INSTALLED_DOCS)) {
     files.insert(std::string(BLUELIGHT_DEPLOY_FULL_DOC_DIR) + "/" + doc);
   }

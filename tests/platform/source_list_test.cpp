@@ -225,8 +225,9 @@ TEST_F(SourceListWalk, AFailingSourceWritesItsLineAndTheOthersStillGiveTheirs) {
                         "directory"),
                 failure("Instrumentation source \"bogus:x\" (from /etc/kesta/instrumentation.conf) "
                         "cannot be read: unknown kind of source (expected file:<path>, "
-                        "sysfs:<directory>, enclosure:[<directory>], ipmi:[<device>] or "
-                        "ipmi-lan:<host>?credentials=<file>)")}));
+                        "sysfs:<directory>, enclosure:[<directory>], ipmi:[<device>], "
+                        "ipmi-lan:<host>?credentials=<file> or "
+                        "redfish:https://<host>?credentials=<file>)")}));
   ASSERT_EQ(reading.outcomes.size(), 3u);
   EXPECT_EQ(reading.outcomes[0].state, State::Unreadable);
   EXPECT_EQ(reading.outcomes[0].why, "No such file or directory");

@@ -103,7 +103,8 @@ TEST_F(SourceSelection, UnknownSchemeIsLoggedAndThrown) {
   EXPECT_EQ(failureText(),
             "Instrumentation source \"http:bmc0\" (from KESTA_INSTRUMENTATION) cannot be read: "
             "unknown kind of source (expected file:<path>, sysfs:<directory>, "
-            "enclosure:[<directory>], ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
+            "enclosure:[<directory>], ipmi:[<device>], ipmi-lan:<host>?credentials=<file> or "
+            "redfish:https://<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, TextWithoutSchemeIsLoggedAndThrown) {
@@ -111,7 +112,8 @@ TEST_F(SourceSelection, TextWithoutSchemeIsLoggedAndThrown) {
   EXPECT_EQ(failureText(),
             "Instrumentation source \"/var/lib/tree.json\" (from KESTA_INSTRUMENTATION) cannot be "
             "read: unknown kind of source (expected file:<path>, sysfs:<directory>, "
-            "enclosure:[<directory>], ipmi:[<device>] or ipmi-lan:<host>?credentials=<file>)");
+            "enclosure:[<directory>], ipmi:[<device>], ipmi-lan:<host>?credentials=<file> or "
+            "redfish:https://<host>?credentials=<file>)");
 }
 
 TEST_F(SourceSelection, FileWithoutPathIsLoggedAndThrown) {

@@ -11,12 +11,10 @@
 #ifndef KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMICREDENTIALS_H
 #define KESTA_PLATFORM_INSTRUMENTATION_IPMI_IPMICREDENTIALS_H
 
-#include <sys/stat.h>
-#include <sys/types.h>
-
 #include <string>
 #include <string_view>
 
+#include "instrumentation/CredentialsFile.h"
 #include "os/FileSystem.h"
 
 namespace Kesta {
@@ -43,9 +41,6 @@ struct IpmiCredentials {
   ~IpmiCredentials();
 };
 
-// Overwrites the characters of `text`, then empties it.
-void wipe(std::string& text) noexcept;
-
 // True for the cipher suites the network transport offers. Suite 0 (no authentication at all)
 // is refused on purpose.
 bool isSupportedCipherSuite(unsigned int suite);
@@ -56,14 +51,8 @@ bool isSupportedCipherSuite(unsigned int suite);
 // unsupported cipher suite. The messages name the line and the name, never a value.
 IpmiCredentials parseIpmiCredentials(std::string_view text, const std::string& file);
 
-// Why a file with status `info` must not hold credentials for a process running as `user`, or
-// "" when it may: it must be a regular file, owned by that user or by root, and give its group
-// and others no permission at all.
-std::string credentialsFileProblem(const struct stat& info, uid_t user);
-
-// Reads and parses the credentials file at `file` through `files` after checking it with
-// credentialsFileProblem (for the process's effective user), before a byte of it is read.
-// Throws SourceError.
+// Reads and parses the credentials file at `file` through `files` by the rules every credentials
+// file follows (readCredentialsFile in CredentialsFile.h). Throws SourceError.
 IpmiCredentials readIpmiCredentials(const std::string& file, FileSystem& files);
 // The same through the real file system.
 IpmiCredentials readIpmiCredentials(const std::string& file);

@@ -25,8 +25,6 @@ constexpr const char* kLanScheme = "ipmi-lan:";
 constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
 constexpr int kFailureLevel = 6000;
 
-bool isDigit(char c) { return c >= '0' && c <= '9'; }
-
 // Takes the shared options out of `options`; whatever remains is unknown.
 IpmiSourceOptions takeSharedOptions(std::map<std::string, std::string>& options) {
   IpmiSourceOptions shared;
@@ -44,16 +42,6 @@ IpmiSourceOptions takeSharedOptions(std::map<std::string, std::string>& options)
   }
   return shared;
 }
-
-bool isHostNameCharacter(char c) {
-  return isDigit(c) || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || c == '-' || c == '.' ||
-         c == '_';
-}
-
-// Inside brackets: hexadecimal groups, dots of an embedded IPv4 address and a zone after '%'.
-bool isBracketedAddressCharacter(char c) { return isHostNameCharacter(c) || c == ':' || c == '%'; }
-
-bool isIpv6(const std::string& host) { return host.find(':') != std::string::npos; }
 
 void logUnreadable(const std::string& source, const std::string& why) {
   VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,
@@ -85,51 +73,9 @@ IpmiDeviceSourceSettings parseIpmiDeviceSource(std::string_view rest) {
 IpmiLanSourceSettings parseIpmiLanSource(std::string_view rest) {
   const auto [where, optionText] = splitAtQuestionMark(rest);
   IpmiLanSourceSettings settings;
-  if (where.empty()) {
-    throw SourceError("no host is named after \"ipmi-lan:\"");
-  }
-  std::string_view host;
-  std::string_view port;
-  if (where.front() == '[') {
-    const std::string_view::size_type close = where.find(']');
-    if (close == std::string_view::npos) {
-      throw SourceError("the address \"" + printable(where) + "\" has no closing ']'");
-    }
-    host = where.substr(1, close - 1);
-    const std::string_view after = where.substr(close + 1);
-    if (!after.empty()) {
-      if (after.front() != ':') {
-        throw SourceError("only \":<port>\" may follow the address in brackets");
-      }
-      port = after.substr(1);
-      if (port.empty()) {
-        throw SourceError("no port follows the ':' after the address");
-      }
-    }
-    if (host.find(':') == std::string_view::npos ||
-        !std::all_of(host.begin(), host.end(), isBracketedAddressCharacter)) {
-      throw SourceError("\"" + printable(host) + "\" in brackets is not an IPv6 address");
-    }
-  } else {
-    const std::string_view::size_type colon = where.find(':');
-    if (colon != std::string_view::npos && where.find(':', colon + 1) != std::string_view::npos) {
-      throw SourceError("an IPv6 address is written in brackets, e.g. ipmi-lan:[fd00::5]:623");
-    }
-    host = where.substr(0, colon);
-    if (colon != std::string_view::npos) {
-      port = where.substr(colon + 1);
-      if (port.empty()) {
-        throw SourceError("no port follows the ':' after the host");
-      }
-    }
-    if (host.empty() || !std::all_of(host.begin(), host.end(), isHostNameCharacter)) {
-      throw SourceError("\"" + printable(host) + "\" is not a host name or IPv4 address");
-    }
-  }
-  settings.host = asciiLowerCopy(host);
-  if (!port.empty()) {
-    settings.port = parsePortText(port);
-  }
+  const HostAndPort address = parseHostAndPort(where, kLanScheme, "ipmi-lan:[fd00::5]:623");
+  settings.host = address.host;
+  settings.port = address.port.value_or(kIpmiLanDefaultPort);
 
   std::map<std::string, std::string> options = parseOptionList(optionText);
   settings.options = takeSharedOptions(options);
@@ -154,8 +100,8 @@ std::string ipmiDevicePath(const IpmiDeviceSourceSettings& settings) {
 }
 
 std::string ipmiLanPath(const IpmiLanSourceSettings& settings) {
-  const std::string host = isIpv6(settings.host) ? "[" + settings.host + "]" : settings.host;
-  return std::string(kLanScheme) + host + ":" + std::to_string(settings.port);
+  return std::string(kLanScheme) + bracketedHost(settings.host) + ":" +
+         std::to_string(settings.port);
 }
 
 IpmiSource::TransportFactory ipmiDeviceTransportFactory(const IpmiDeviceSourceSettings& settings,

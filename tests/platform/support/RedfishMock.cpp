@@ -1,0 +1,301 @@
+#include "RedfishMock.h"
+
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/prctl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <mutex>
+#include <sstream>
+#include <stdexcept>
+#include <thread>
+
+namespace redfish_test {
+
+namespace {
+
+using namespace std::chrono_literals;
+using Clock = std::chrono::steady_clock;
+
+constexpr auto kStartTimeout = 10s;
+constexpr auto kStopGrace = 2s;
+// The certificates are made afresh every week and are valid for 30 days, so a build tree never
+// holds expired ones.
+constexpr long kDaysPerPki = 7;
+
+bool isExecutable(const std::string& path) {
+  return !path.empty() && ::access(path.c_str(), X_OK) == 0;
+}
+
+bool exists(const std::string& path) {
+  struct stat info = {};
+  return !path.empty() && ::stat(path.c_str(), &info) == 0;
+}
+
+// Runs a program to its end with its output going to `output`; its exit status, or -1.
+int run(std::vector<std::string> arguments, const std::string& output) {
+  std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
+  for (std::string& argument : arguments) {
+    argv.push_back(argument.data());
+  }
+  argv.push_back(nullptr);
+  const pid_t child = ::fork();
+  if (child < 0) {
+    return -1;
+  }
+  if (child == 0) {
+    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+    const int in = ::open("/dev/null", O_RDONLY);
+    if (out >= 0) {
+      ::dup2(out, STDOUT_FILENO);
+      ::dup2(out, STDERR_FILENO);
+    }
+    if (in >= 0) {
+      ::dup2(in, STDIN_FILENO);
+    }
+    ::execv(argv[0], argv.data());
+    ::_exit(127);
+  }
+  int status = 0;
+  while (::waitpid(child, &status, 0) < 0 && errno == EINTR) {
+  }
+  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+Pki makePki() {
+  const long days = static_cast<long>(std::time(nullptr) / 86400);
+  const std::string root = REDFISH_TEST_PKI_ROOT;
+  std::filesystem::create_directories(root);
+  Pki pki;
+  pki.directory = root + "/week-" + std::to_string(days / kDaysPerPki);
+  pki.authority = pki.directory + "/ca.pem";
+  pki.otherAuthority = pki.directory + "/other-ca.pem";
+  pki.key = pki.directory + "/server.key";
+  pki.server = pki.directory + "/server.pem";
+  pki.otherServer = pki.directory + "/other-server.pem";
+  pki.wrongName = pki.directory + "/wrong-name.pem";
+  if (exists(pki.wrongName)) {
+    return pki;
+  }
+  // Made in a folder of its own and renamed into place, so that test processes running at once
+  // never see half of it; the first rename wins and the others use its certificates.
+  std::string scratch = root + "/making-XXXXXX";
+  if (::mkdtemp(scratch.data()) == nullptr) {
+    throw std::runtime_error("cannot make a folder in " + root);
+  }
+  const std::string log = scratch + ".log";
+  const int status = run({REDFISH_TEST_PYTHON, REDFISH_TEST_MOCK, "pki", scratch}, log);
+  if (status != 0) {
+    const std::string why = testsupport::readFile(log);
+    std::filesystem::remove_all(scratch);
+    std::filesystem::remove(log);
+    throw std::runtime_error("the test certificates cannot be made: " + why);
+  }
+  std::filesystem::remove(log);
+  if (::rename(scratch.c_str(), pki.directory.c_str()) != 0) {
+    std::filesystem::remove_all(scratch);
+  }
+  if (!exists(pki.wrongName)) {
+    throw std::runtime_error("the test certificates are missing from " + pki.directory);
+  }
+  return pki;
+}
+
+}  // namespace
+
+std::optional<std::string> mockUnavailable() {
+  if (!isExecutable(REDFISH_TEST_PYTHON)) {
+    return std::string("python3 was not found when the build was configured");
+  }
+  if (!isExecutable(REDFISH_TEST_OPENSSL)) {
+    return std::string("the openssl command was not found when the build was configured");
+  }
+  if (std::string(REDFISH_TEST_PLUGIN).empty()) {
+    return std::string(
+        "the Redfish transport bluelight-redfish.so was not built: libcurl was not found when the "
+        "build was configured (BLUELIGHT_REDFISH)");
+  }
+  if (!exists(REDFISH_TEST_PLUGIN)) {
+    return "the Redfish transport " + std::string(REDFISH_TEST_PLUGIN) + " is missing";
+  }
+  return std::nullopt;
+}
+
+bool optedOut() {
+  const char* value = std::getenv(kOptOutVariable);
+  return value != nullptr && value[0] != '\0' && std::string(value) != "0";
+}
+
+const Pki& pki() {
+  static std::mutex mutex;
+  static std::optional<Pki> made;
+  std::lock_guard<std::mutex> lock(mutex);
+  if (!made) {
+    made = makePki();
+  }
+  return *made;
+}
+
+std::string serviceFile(const std::string& service) {
+  return std::string(REDFISH_TEST_SERVICES) + "/" + service + ".json";
+}
+
+void writePrivateFile(const std::string& file, const std::string& text) {
+  testsupport::writeFile(file, text);
+  if (::chmod(file.c_str(), 0600) != 0) {
+    throw std::runtime_error("cannot chmod " + file);
+  }
+}
+
+RedfishMock::RedfishMock(const MockOptions& options)
+    : credentials_(dir_.file("reader.conf")),
+      wrongCredentials_(dir_.file("wrong.conf")),
+      eventsFile_(dir_.file("events.log")),
+      outputFile_(dir_.file("mock.out")) {
+  writePrivateFile(credentials_, "user = reader\npassword = reader-pass\n");
+  writePrivateFile(wrongCredentials_, "user = reader\npassword = not-the-password\n");
+  const Pki& certificates = pki();
+  const std::string portFile = dir_.file("port");
+  std::vector<std::string> arguments = {
+      REDFISH_TEST_PYTHON,
+      REDFISH_TEST_MOCK,
+      "serve",
+      "--service",
+      serviceFile(options.service),
+      "--cert",
+      options.certificate.empty() ? certificates.server : options.certificate,
+      "--key",
+      certificates.key,
+      "--port-file",
+      portFile,
+      "--events",
+      eventsFile_};
+  for (const std::string& behaviour : options.behaviours) {
+    arguments.emplace_back("--behave");
+    arguments.push_back(behaviour);
+  }
+  // Everything the child needs is ready before fork: it may only make async-signal-safe calls.
+  std::vector<char*> argv;
+  argv.reserve(arguments.size() + 1);
+  for (std::string& argument : arguments) {
+    argv.push_back(argument.data());
+  }
+  argv.push_back(nullptr);
+  const std::string output = outputFile_;
+  const pid_t parent = ::getpid();
+  const pid_t child = ::fork();
+  if (child < 0) {
+    throw std::runtime_error("fork failed");
+  }
+  if (child == 0) {
+    // Should the test process die without stopping it (a crash, a CTest timeout), the mock goes
+    // too instead of living on.
+    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    if (::getppid() != parent) {
+      ::_exit(126);
+    }
+    const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+    const int in = ::open("/dev/null", O_RDONLY);
+    if (out >= 0) {
+      ::dup2(out, STDOUT_FILENO);
+      ::dup2(out, STDERR_FILENO);
+    }
+    if (in >= 0) {
+      ::dup2(in, STDIN_FILENO);
+    }
+    ::execv(argv[0], argv.data());
+    ::_exit(127);
+  }
+  pid_ = child;
+
+  const Clock::time_point giveUp = Clock::now() + kStartTimeout;
+  while (Clock::now() < giveUp) {
+    int status = 0;
+    if (::waitpid(pid_, &status, WNOHANG) == pid_) {
+      pid_ = -1;
+      throw std::runtime_error("the mock Redfish service ended at once: " + this->output());
+    }
+    const std::string port = testsupport::readFile(portFile);
+    if (!port.empty()) {
+      port_ = static_cast<unsigned int>(std::stoul(port));
+      return;
+    }
+    std::this_thread::sleep_for(10ms);
+  }
+  stop();
+  throw std::runtime_error("the mock Redfish service did not listen within 10 s: " + output);
+}
+
+RedfishMock::~RedfishMock() { stop(); }
+
+void RedfishMock::stop() {
+  if (pid_ <= 0) {
+    return;
+  }
+  ::kill(pid_, SIGTERM);
+  const Clock::time_point giveUp = Clock::now() + kStopGrace;
+  int status = 0;
+  while (Clock::now() < giveUp) {
+    if (::waitpid(pid_, &status, WNOHANG) == pid_) {
+      pid_ = -1;
+      return;
+    }
+    std::this_thread::sleep_for(5ms);
+  }
+  ::kill(pid_, SIGKILL);
+  ::waitpid(pid_, &status, 0);
+  pid_ = -1;
+}
+
+std::string RedfishMock::sourceText(const std::string& options) const {
+  return sourceTextWithoutCa("ca=" + pki().authority + (options.empty() ? "" : "&" + options));
+}
+
+std::string RedfishMock::sourceTextWithoutCa(const std::string& options) const {
+  std::string text =
+      "redfish:https://127.0.0.1:" + std::to_string(port_) + "?credentials=" + credentials_;
+  if (!options.empty()) {
+    text += "&" + options;
+  }
+  return text;
+}
+
+std::vector<std::string> RedfishMock::events() const {
+  std::vector<std::string> lines;
+  std::istringstream in(testsupport::readFile(eventsFile_));
+  for (std::string line; std::getline(in, line);) {
+    lines.push_back(line);
+  }
+  return lines;
+}
+
+std::size_t RedfishMock::connections() const {
+  std::size_t count = 0;
+  for (const std::string& event : events()) {
+    count += event == "connect" ? 1 : 0;
+  }
+  return count;
+}
+
+std::vector<std::string> RedfishMock::requests() const {
+  std::vector<std::string> requests;
+  for (const std::string& event : events()) {
+    if (event != "connect" && event.rfind("handshake-failed", 0) != 0) {
+      requests.push_back(event);
+    }
+  }
+  return requests;
+}
+
+std::string RedfishMock::output() const { return testsupport::readFile(outputFile_); }
+
+}  // namespace redfish_test
