@@ -186,8 +186,9 @@ TEST(RedfishSourceText, TheSchemeIsRegisteredWithTheOtherSources) {
     FAIL() << "accepted";
   } catch (const SourceError& error) {
     EXPECT_EQ(std::string(error.what()),
-              "unknown kind of source (expected file:<path>, sysfs:<directory>, ipmi:[<device>], "
-              "ipmi-lan:<host>?credentials=<file> or redfish:https://<host>?credentials=<file>)");
+              "unknown kind of source (expected file:<path>, sysfs:<directory>, "
+              "enclosure:[<directory>], ipmi:[<device>], ipmi-lan:<host>?credentials=<file> or "
+              "redfish:https://<host>?credentials=<file>)");
   }
 }
 
