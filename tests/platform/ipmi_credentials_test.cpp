@@ -149,7 +149,7 @@ TEST(IpmiCredentialsFormat, RefusesWhatItCannotUse) {
             prefix +
                 "line 3: unknown name (expected user, password, privilege or "
                 "cipher-suite)");
-  EXPECT_EQ(parseError(std::string("user=a\npassword=b\0c", 20)),
+  EXPECT_EQ(parseError(std::string("user=a\npassword=b\0c", 19)),
             prefix + "line 2: the value holds a NUL character");
 }
 

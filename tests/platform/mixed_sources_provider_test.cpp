@@ -62,7 +62,7 @@ std::string garbageLine(const std::string& source) {
 // An LED class directory under `root`: a blinking identify LED, a lit blue status LED and a caps
 // lock LED (neither blue nor an identifier).
 std::string writeLedClass(const TempDir& root) {
-  const std::string leds = root.file("sys/class/leds");
+  std::string leds = root.file("sys/class/leds");
   const auto led = [&](const std::string& name, const std::string& trigger,
                        const std::string& brightness) {
     std::filesystem::create_directories(leds + "/" + name);

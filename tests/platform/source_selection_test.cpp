@@ -35,9 +35,13 @@ std::string firstPath(Instrumentation& cursor) {
 
 // Every test gets its own configuration file path, and the default back afterwards.
 class SourceSelection : public ::testing::Test {
+ public:
+  SourceSelection(const SourceSelection&) = delete;
+  SourceSelection& operator=(const SourceSelection&) = delete;
+  ~SourceSelection() override { setConfigurationFileForTesting(""); }
+
  protected:
   SourceSelection() { setConfigurationFileForTesting(dir_.file("instrumentation.conf")); }
-  ~SourceSelection() override { setConfigurationFileForTesting(""); }
 
   std::string configFile() const { return dir_.file("instrumentation.conf"); }
 

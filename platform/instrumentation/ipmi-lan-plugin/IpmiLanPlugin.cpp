@@ -63,8 +63,10 @@ void wipeText(std::string& text) noexcept {
   text.clear();
 }
 
-// One BMC and one account; a session is shared by the reads with equal keys.
-struct SessionKey {
+// One BMC and one account; a session is shared by the reads with equal keys. No move members on
+// purpose: moving a short string leaves its bytes in the moved-from object's own buffer, where
+// the destructor, seeing it empty, would not wipe them; a copy leaves two keys that are both wiped.
+struct SessionKey {  // NOLINT(cppcoreguidelines-special-member-functions)
   std::string host;
   unsigned int port = 0;
   std::string user;

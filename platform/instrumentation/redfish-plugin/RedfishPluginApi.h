@@ -28,6 +28,9 @@ extern "C" {
 #define BLUELIGHT_REDFISH_MAX_REASON 256u
 #define BLUELIGHT_REDFISH_MAX_LOCATION 2048u
 
+// The interface is C, so that the transport can be built with any compiler: typedef, not using.
+// NOLINTBEGIN(modernize-use-using)
+
 // The service a session talks to and how. Everything is read during the call that opens the
 // session; the session keeps copies of what it needs (libcurl keeps its own copy of the account
 // until the session is closed; the plug-in's own copies are overwritten at once).
@@ -94,6 +97,8 @@ typedef struct BluelightRedfishApi {
 } BluelightRedfishApi;
 
 typedef const BluelightRedfishApi* (*BluelightRedfishEntryPoint)(void);
+
+// NOLINTEND(modernize-use-using)
 
 #ifdef __cplusplus
 }
