@@ -5,9 +5,9 @@
 # The mock tests (redfish_mock, redfish_provider) start the mock service of tests/redfish-mock on
 # a loopback port with certificates made by the openssl command, and read it through the built
 # transport bluelight-redfish.so; they need python3, openssl and libcurl's development files
-# (Debian packages python3, openssl, libcurl4-openssl-dev). When any of it is missing they FAIL
-# and say what is missing; developers may set BLUELIGHT_SKIP_REDFISH_MOCK_TESTS=1 to have them
-# skipped instead. redfish_fixture reads the source text of the CTest fixture of
+# (Debian packages python3, openssl, libcurl4-openssl-dev, in the test group of
+# scripts/packages.txt). A build with the tests needs all three, so none of these tests is ever
+# skipped: configuring stops and says what is missing. redfish_fixture reads the source text of the CTest fixture of
 # tests/redfish-mock (fixture ${BLUELIGHT_REDFISH_FIXTURE}, file
 # ${BLUELIGHT_REDFISH_FIXTURE_SOURCE_FILE}), to show that the fixture serves what other suites
 # get from it.
@@ -21,16 +21,15 @@ set(REDFISH_TEST_UNITS
   redfish_fixture)
 
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
-find_program(BLUELIGHT_OPENSSL openssl DOC "The openssl command, which makes the Redfish tests' certificates")
-if(NOT BLUELIGHT_OPENSSL)
-  set(BLUELIGHT_OPENSSL "")
-endif()
+find_program(BLUELIGHT_OPENSSL openssl REQUIRED
+             DOC "The openssl command, which makes the Redfish tests' certificates")
 find_program(BLUELIGHT_READELF NAMES readelf ${CMAKE_READELF} REQUIRED)
-if(TARGET bluelight_redfish)
-  set(_redfish_plugin $<TARGET_FILE:bluelight_redfish>)
-else()
-  set(_redfish_plugin "")
+if(NOT TARGET bluelight_redfish)
+  message(FATAL_ERROR "The Redfish tests need the HTTPS transport, which needs libcurl's development "
+                      "files (Debian package libcurl4-openssl-dev; scripts/ensure-packages.sh test "
+                      "installs it), or configure with -DBLUELIGHT_BUILD_TESTS=OFF")
 endif()
+set(_redfish_plugin $<TARGET_FILE:bluelight_redfish>)
 
 foreach(unit IN LISTS REDFISH_TEST_UNITS)
   set(target platform_${unit}_test)
@@ -42,7 +41,6 @@ foreach(unit IN LISTS REDFISH_TEST_UNITS)
   target_include_directories(${target} PRIVATE ${CMAKE_CURRENT_SOURCE_DIR}/support)
   target_compile_definitions(${target} PRIVATE
     REDFISH_TEST_PYTHON="${Python3_EXECUTABLE}"
-    REDFISH_TEST_OPENSSL="${BLUELIGHT_OPENSSL}"
     REDFISH_TEST_MOCK="${BLUELIGHT_REDFISH_MOCK}"
     REDFISH_TEST_SERVICES="${BLUELIGHT_REDFISH_MOCK_SERVICES}"
     REDFISH_TEST_PKI_ROOT="${CMAKE_CURRENT_BINARY_DIR}/redfish-pki"
@@ -69,5 +67,5 @@ target_link_libraries(platform_redfish_walk_test PRIVATE nlohmann_json::nlohmann
 # The transport tests read the provider library's dependencies and load the plug-in.
 add_dependencies(platform_redfish_transport_test bluelightprofileprovider)
 # The provider tests load the built provider library into the in-process host.
-target_link_libraries(platform_redfish_provider_test PRIVATE cmpihost)
+target_link_libraries(platform_redfish_provider_test PRIVATE platform_test_provider)
 add_dependencies(platform_redfish_provider_test bluelightprofileprovider)

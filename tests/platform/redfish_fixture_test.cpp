@@ -21,7 +21,6 @@ using testsupport::LogCapture;
 class RedfishFixtureTest : public ::testing::Test {
  protected:
   void SetUp() override {
-    REQUIRE_REDFISH_MOCK();
     const std::vector<std::string> lines =
         platform_test::splitLines(testsupport::readFile(REDFISH_TEST_FIXTURE_SOURCE_FILE));
     ASSERT_EQ(lines.size(), 1u) << REDFISH_TEST_FIXTURE_SOURCE_FILE

@@ -33,8 +33,6 @@ const std::string kDrives = "/redfish/v1/Chassis/1U/Drives/";
 
 class RedfishMockTest : public ::testing::Test {
  protected:
-  void SetUp() override { REQUIRE_REDFISH_MOCK(); }
-
   // The nodes of one read of `text`; the log lines it wrote go to `lines`.
   std::vector<InstrumentationNode> read(const std::string& text,
                                         std::vector<std::string>* lines = nullptr) {

@@ -13,8 +13,10 @@ Commands:
       other-ca.pem), and for 127.0.0.1, ::1 and localhost a server certificate of each
       (server.pem, other-server.pem), plus one of the first authority for another name
       (wrong-name.pem); the servers share the key server.key.
-  serve --service FILE --cert FILE --key FILE --port-file FILE --events FILE [options]
-      Serves FILE on a free loopback port, writes the port to --port-file once it listens, and
+  serve --service FILE --cert FILE --key FILE --ready-fd N --events FILE [options]
+      Serves FILE on a free loopback port, writes the port and a line end to the inherited file
+      descriptor N once it listens (and closes it, so a reader that gets no port knows the mock
+      ended before it listened), and
       appends one line per event to --events: "connect" for every TLS handshake, "handshake-failed
       <why>", "<METHOD> <path> <status>" for every request.
         --user/--password  the account it accepts (default reader / reader-pass)
@@ -200,11 +202,9 @@ def serve(args):
     server.events = Events(args.events)
     if args.lifetime:
         threading.Timer(args.lifetime, lambda: os._exit(0)).start()
-    temporary = args.port_file + ".tmp"
-    with open(temporary, "w", encoding="utf-8") as out:
-        out.write(f"{server.server_port}\n")
-    os.replace(temporary, args.port_file)
     signal.signal(signal.SIGTERM, lambda *_: os._exit(0))
+    with os.fdopen(args.ready_fd, "w", encoding="utf-8") as ready:
+        ready.write(f"{server.server_port}\n")
     server.serve_forever()
 
 
@@ -243,17 +243,6 @@ def make_pki(directory):
                 "-extfile", f"{name}.ext", "-extensions", "v3", cwd=directory)
 
 
-def wait_for_file(path, process, seconds):
-    deadline = time.monotonic() + seconds
-    while time.monotonic() < deadline:
-        if os.path.exists(path):
-            return True
-        if process.poll() is not None:
-            return False
-        time.sleep(0.02)
-    return False
-
-
 def fixture_start(args):
     directory = os.path.abspath(args.dir)
     pki = os.path.join(directory, "pki")
@@ -264,23 +253,25 @@ def fixture_start(args):
     with open(credentials, "w", encoding="utf-8") as out:
         out.write("# the account of the mock Redfish service\nuser = reader\npassword = reader-pass\n")
     os.chmod(credentials, 0o600)
-    port_file = os.path.join(directory, "port")
-    if os.path.exists(port_file):
-        os.remove(port_file)
+    # The mock says it listens by writing its port to the pipe; the read blocks until then, or
+    # ends empty when the mock ended before (its end of the pipe closes with it).
+    ready, ready_to_write = os.pipe()
     with open(os.path.join(directory, "mock.log"), "w", encoding="utf-8") as log:
         process = subprocess.Popen(
             [sys.executable, os.path.abspath(__file__), "serve", "--service", args.service,
              "--cert", os.path.join(pki, "server.pem"), "--key", os.path.join(pki, "server.key"),
-             "--port-file", port_file, "--events", os.path.join(directory, "events.log"),
+             "--ready-fd", str(ready_to_write), "--events", os.path.join(directory, "events.log"),
              "--lifetime", str(args.lifetime)],
-            stdin=subprocess.DEVNULL, stdout=log, stderr=log, start_new_session=True)
-    if not wait_for_file(port_file, process, 10):
-        process.kill()
+            stdin=subprocess.DEVNULL, stdout=log, stderr=log, start_new_session=True,
+            pass_fds=(ready_to_write,))
+    os.close(ready_to_write)
+    with os.fdopen(ready, encoding="utf-8") as source:
+        port = source.readline().strip()
+    if not port:
+        process.wait()
         sys.exit("the mock Redfish service did not start; see " + os.path.join(directory, "mock.log"))
     with open(os.path.join(directory, "mock.pid"), "w", encoding="utf-8") as out:
         out.write(f"{process.pid}\n")
-    with open(port_file, encoding="utf-8") as source:
-        port = source.read().strip()
     text = (f"redfish:https://127.0.0.1:{port}?credentials={credentials}"
             f"&ca={os.path.join(pki, 'ca.pem')}")
     with open(os.path.join(directory, "source.txt"), "w", encoding="utf-8") as out:
@@ -302,18 +293,11 @@ def fixture_stop(args, quiet=False):
     with open(pid_file, encoding="utf-8") as source:
         pid = int(source.read().strip())
     os.remove(pid_file)
+    # The mock keeps nothing worth a clean exit: its events are written line by line.
     try:
-        os.kill(pid, signal.SIGTERM)
+        os.kill(pid, signal.SIGKILL)
     except ProcessLookupError:
-        return
-    deadline = time.monotonic() + 5
-    while time.monotonic() < deadline:
-        try:
-            os.kill(pid, 0)
-        except ProcessLookupError:
-            return
-        time.sleep(0.02)
-    os.kill(pid, signal.SIGKILL)
+        pass
 
 
 def main():
@@ -325,7 +309,7 @@ def main():
     run.add_argument("--service", required=True)
     run.add_argument("--cert", required=True)
     run.add_argument("--key", required=True)
-    run.add_argument("--port-file", required=True)
+    run.add_argument("--ready-fd", type=int, required=True)
     run.add_argument("--events", required=True)
     run.add_argument("--bind", default="127.0.0.1")
     run.add_argument("--user", default="reader")

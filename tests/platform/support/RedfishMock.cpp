@@ -8,31 +8,22 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <mutex>
 #include <sstream>
 #include <stdexcept>
-#include <thread>
 
 namespace redfish_test {
 
 namespace {
 
-using namespace std::chrono_literals;
-using Clock = std::chrono::steady_clock;
-
-constexpr auto kStartTimeout = 10s;
-constexpr auto kStopGrace = 2s;
+// The descriptor the mock writes its port to once it listens ("--ready-fd").
+constexpr int kReadyFd = 3;
 // The certificates are made afresh every week and are valid for 30 days, so a build tree never
 // holds expired ones.
 constexpr long kDaysPerPki = 7;
-
-bool isExecutable(const std::string& path) {
-  return !path.empty() && ::access(path.c_str(), X_OK) == 0;
-}
 
 bool exists(const std::string& path) {
   struct stat info = {};
@@ -112,29 +103,6 @@ Pki makePki() {
 
 }  // namespace
 
-std::optional<std::string> mockUnavailable() {
-  if (!isExecutable(REDFISH_TEST_PYTHON)) {
-    return std::string("python3 was not found when the build was configured");
-  }
-  if (!isExecutable(REDFISH_TEST_OPENSSL)) {
-    return std::string("the openssl command was not found when the build was configured");
-  }
-  if (std::string(REDFISH_TEST_PLUGIN).empty()) {
-    return std::string(
-        "the Redfish transport bluelight-redfish.so was not built: libcurl was not found when the "
-        "build was configured (BLUELIGHT_REDFISH)");
-  }
-  if (!exists(REDFISH_TEST_PLUGIN)) {
-    return "the Redfish transport " + std::string(REDFISH_TEST_PLUGIN) + " is missing";
-  }
-  return std::nullopt;
-}
-
-bool optedOut() {
-  const char* value = std::getenv(kOptOutVariable);
-  return value != nullptr && value[0] != '\0' && std::string(value) != "0";
-}
-
 const Pki& pki() {
   static std::mutex mutex;
   static std::optional<Pki> made;
@@ -164,7 +132,6 @@ RedfishMock::RedfishMock(const MockOptions& options)
   writePrivateFile(credentials_, "user = reader\npassword = reader-pass\n");
   writePrivateFile(wrongCredentials_, "user = reader\npassword = not-the-password\n");
   const Pki& certificates = pki();
-  const std::string portFile = dir_.file("port");
   std::vector<std::string> arguments = {
       REDFISH_TEST_PYTHON,
       REDFISH_TEST_MOCK,
@@ -175,8 +142,8 @@ RedfishMock::RedfishMock(const MockOptions& options)
       options.certificate.empty() ? certificates.server : options.certificate,
       "--key",
       certificates.key,
-      "--port-file",
-      portFile,
+      "--ready-fd",
+      std::to_string(kReadyFd),
       "--events",
       eventsFile_};
   for (const std::string& behaviour : options.behaviours) {
@@ -191,12 +158,28 @@ RedfishMock::RedfishMock(const MockOptions& options)
   }
   argv.push_back(nullptr);
   const std::string output = outputFile_;
+  // The mock writes its port to the pipe once it listens; reading blocks until then, and ends
+  // without a port when the mock ended first (its end of the pipe closes with it). No clock and
+  // no polling: a mock that never comes up is the test runner's timeout to catch.
+  int ready[2] = {-1, -1};
+  if (::pipe2(ready, O_CLOEXEC) != 0) {
+    throw std::runtime_error("pipe failed");
+  }
   const pid_t parent = ::getpid();
   const pid_t child = ::fork();
   if (child < 0) {
+    ::close(ready[0]);
+    ::close(ready[1]);
     throw std::runtime_error("fork failed");
   }
   if (child == 0) {
+    // The write end at kReadyFd, kept across exec (dup2 clears close-on-exec; a descriptor that
+    // already has the number keeps it, so the flag is cleared by hand then).
+    if (ready[1] == kReadyFd) {
+      ::fcntl(kReadyFd, F_SETFD, 0);
+    } else if (::dup2(ready[1], kReadyFd) < 0) {
+      ::_exit(126);
+    }
     // Should the test process die without stopping it (a crash, a CTest timeout), the mock goes
     // too instead of living on.
     ::prctl(PR_SET_PDEATHSIG, SIGKILL);
@@ -216,23 +199,25 @@ RedfishMock::RedfishMock(const MockOptions& options)
     ::_exit(127);
   }
   pid_ = child;
-
-  const Clock::time_point giveUp = Clock::now() + kStartTimeout;
-  while (Clock::now() < giveUp) {
-    int status = 0;
-    if (::waitpid(pid_, &status, WNOHANG) == pid_) {
-      pid_ = -1;
-      throw std::runtime_error("the mock Redfish service ended at once: " + this->output());
+  ::close(ready[1]);
+  std::string port;
+  char byte = 0;
+  while (port.find('\n') == std::string::npos) {
+    const ssize_t got = ::read(ready[0], &byte, 1);
+    if (got < 0 && errno == EINTR) {
+      continue;
     }
-    const std::string port = testsupport::readFile(portFile);
-    if (!port.empty()) {
-      port_ = static_cast<unsigned int>(std::stoul(port));
-      return;
+    if (got <= 0) {
+      break;
     }
-    std::this_thread::sleep_for(10ms);
+    port += byte;
   }
-  stop();
-  throw std::runtime_error("the mock Redfish service did not listen within 10 s: " + output);
+  ::close(ready[0]);
+  if (port.empty() || port.back() != '\n') {
+    stop();
+    throw std::runtime_error("the mock Redfish service ended before it listened: " + output());
+  }
+  port_ = static_cast<unsigned int>(std::stoul(port));
 }
 
 RedfishMock::~RedfishMock() { stop(); }
@@ -241,18 +226,12 @@ void RedfishMock::stop() {
   if (pid_ <= 0) {
     return;
   }
-  ::kill(pid_, SIGTERM);
-  const Clock::time_point giveUp = Clock::now() + kStopGrace;
-  int status = 0;
-  while (Clock::now() < giveUp) {
-    if (::waitpid(pid_, &status, WNOHANG) == pid_) {
-      pid_ = -1;
-      return;
-    }
-    std::this_thread::sleep_for(5ms);
-  }
+  // The mock keeps nothing worth a clean exit (its events are written line by line), and SIGKILL
+  // cannot be caught, so the wait below ends.
   ::kill(pid_, SIGKILL);
-  ::waitpid(pid_, &status, 0);
+  int status = 0;
+  while (::waitpid(pid_, &status, 0) < 0 && errno == EINTR) {
+  }
   pid_ = -1;
 }
 

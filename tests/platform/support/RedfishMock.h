@@ -2,11 +2,11 @@
 // tests/redfish-mock/redfish_mock.py, started by python3 on a free port (the mock picks it and
 // writes it to a file), with the certificates the tests make with the openssl command. The mock
 // is always stopped by its process id when the object goes - also when a test fails or throws -
-// and it is asked to die with the test process should that be killed.
+// and it is asked to die with the test process should that be killed. python3, openssl and the
+// transport plug-in are required when the build is configured, so these tests always run.
 #ifndef BLUELIGHT_TESTS_PLATFORM_REDFISHMOCK_H
 #define BLUELIGHT_TESTS_PLATFORM_REDFISHMOCK_H
 
-#include <gtest/gtest.h>
 #include <sys/types.h>
 
 #include <optional>
@@ -16,29 +16,6 @@
 #include "TestSupport.h"
 
 namespace redfish_test {
-
-// The variable that lets a developer skip the mock tests on a machine without python3 or openssl.
-constexpr const char* kOptOutVariable = "BLUELIGHT_SKIP_REDFISH_MOCK_TESTS";
-
-// What the mock tests need that is missing here (python3, openssl, the transport plug-in), or
-// nothing when they can run.
-std::optional<std::string> mockUnavailable();
-bool optedOut();
-
-// Fails the current test (or skips it, when BLUELIGHT_SKIP_REDFISH_MOCK_TESTS is set to anything
-// but "" or "0") when the mock tests cannot run. For SetUp().
-#define REQUIRE_REDFISH_MOCK()                                                          \
-  do {                                                                                  \
-    if (const std::optional<std::string> missing = ::redfish_test::mockUnavailable()) { \
-      if (::redfish_test::optedOut()) {                                                 \
-        GTEST_SKIP() << *missing << " (skipped: " << ::redfish_test::kOptOutVariable    \
-                     << " is set)";                                                     \
-      }                                                                                 \
-      FAIL() << *missing << ". Install the Debian packages python3, openssl and "       \
-             << "libcurl4-openssl-dev and configure again, or set "                     \
-             << ::redfish_test::kOptOutVariable << "=1 to skip the mock tests.";        \
-    }                                                                                   \
-  } while (false)
 
 // The certificates of the tests (see "pki" in redfish_mock.py), made once a week per build tree
 // and shared by the test processes; they are valid for 30 days.
@@ -64,14 +41,14 @@ struct MockOptions {
 
 class RedfishMock {
  public:
-  // Starts the mock and waits until it listens; throws std::runtime_error with its output when it
-  // does not come up within 10 s.
+  // Starts the mock and waits until it says it listens; throws std::runtime_error with its output
+  // when it ends before that.
   explicit RedfishMock(const MockOptions& options = {});
   ~RedfishMock();
   RedfishMock(const RedfishMock&) = delete;
   RedfishMock& operator=(const RedfishMock&) = delete;
 
-  // Stops the mock (SIGTERM, then SIGKILL) and reaps it. Idempotent.
+  // Stops the mock (SIGKILL) and reaps it. Idempotent.
   void stop();
 
   unsigned int port() const { return port_; }
