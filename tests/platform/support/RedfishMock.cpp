@@ -215,7 +215,7 @@ RedfishMock::RedfishMock(const MockOptions& options)
   ::close(ready[0]);
   if (port.empty() || port.back() != '\n') {
     stop();
-    throw std::runtime_error("the mock Redfish service ended before it listened: " + output());
+    throw std::runtime_error("the mock Redfish service ended before it listened: " + this->output());
   }
   port_ = static_cast<unsigned int>(std::stoul(port));
 }
