@@ -5,8 +5,7 @@
 // loopback port with the mock's own fixture commands (fixture-start makes the certificates and
 // the credentials file and returns once the mock listens; fixture-stop ends it):
 //   RedfishWalk/RackServer      one chassis, eight drives: 11 GETs a walk, 9 lights
-//   RedfishWalk/BladeEnclosure  four chassis, three storage resources, six drives: 15 GETs, 10
-//   lights
+//   RedfishWalk/BladeEnclosure  four chassis, three storage, six drives: 15 GETs, 10 lights
 //
 //   bluelight-redfish-bench [google-benchmark options]
 //
