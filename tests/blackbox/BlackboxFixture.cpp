@@ -1,6 +1,7 @@
 #include "BlackboxFixture.h"
 
 #include <cstdlib>
+#include <sstream>
 #include <stdexcept>
 #include <string>
 
@@ -36,12 +37,20 @@ void BlackboxTest::useTree(const std::vector<testsupport::Node>& nodes) {
 std::string BlackboxTest::otherSources() {
   // The suites run a second time with the tree as the first of several sources that give no
   // light (tests/blackbox/CMakeLists.txt): read in one walk, they must change no result.
+  // BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILES names files separated by ':', each holding one line
+  // of sources. The Redfish service's file is written only when its fixture has started the mock
+  // (its port is known then), so the files are read when the test runs.
   static const std::string others = []() -> std::string {
-    const char* file = std::getenv("BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILE");
-    if (file == nullptr || *file == '\0') return "";
-    const std::string text = testsupport::readFile(file);
-    if (text.empty()) throw std::runtime_error(std::string("no sources in ") + file);
-    return ";" + text.substr(0, text.find('\n'));
+    const char* files = std::getenv("BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILES");
+    std::string list;
+    std::istringstream names(files != nullptr ? files : "");
+    for (std::string file; std::getline(names, file, ':');) {
+      if (file.empty()) continue;
+      const std::string text = testsupport::readFile(file);
+      if (text.empty()) throw std::runtime_error("no sources in " + file);
+      list += ";" + text.substr(0, text.find('\n'));
+    }
+    return list;
   }();
   return others;
 }

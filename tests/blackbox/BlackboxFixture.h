@@ -46,8 +46,8 @@ class BlackboxTest : public ::testing::Test {
   // Points the instrumentation at a tree of `nodes` (read at every operation), followed by the
   // other sources of the run, if any.
   void useTree(const std::vector<testsupport::Node>& nodes);
-  // The sources the run reads after the tree, from BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILE (one
-  // line, ";"-separated), with a leading ";"; empty in the ordinary run.
+  // The sources the run reads after the tree, with a leading ";": the one line of each file
+  // BLUELIGHT_BLACKBOX_OTHER_SOURCES_FILES names (':'-separated); empty in the ordinary run.
   static std::string otherSources();
   // True in the run with other sources.
   static bool withOtherSources();
