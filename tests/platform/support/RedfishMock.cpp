@@ -14,6 +14,7 @@
 #include <mutex>
 #include <sstream>
 #include <stdexcept>
+#include <utility>
 
 namespace redfish_test {
 
@@ -30,36 +31,61 @@ bool exists(const std::string& path) {
   return !path.empty() && ::stat(path.c_str(), &info) == 0;
 }
 
-// Runs a program to its end with its output going to `output`; its exit status, or -1.
-int run(std::vector<std::string> arguments, const std::string& output) {
+// Starts `arguments` with standard output and error appended to `output` and standard input from
+// /dev/null. The child dies with this process (a crash, a test runner's timeout), so no mock
+// outlives its test. `handOver`, unless -1, is a descriptor the child gets as kReadyFd. Everything
+// is prepared before fork: the child makes only async-signal-safe calls. -1 when fork fails.
+pid_t spawn(std::vector<std::string> arguments, const std::string& output, int handOver = -1) {
   std::vector<char*> argv;
   argv.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) {
     argv.push_back(argument.data());
   }
   argv.push_back(nullptr);
+  const pid_t parent = ::getpid();
   const pid_t child = ::fork();
-  if (child < 0) {
-    return -1;
+  if (child != 0) {
+    return child;
   }
-  if (child == 0) {
-    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-    const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-    const int in = ::open("/dev/null", O_RDONLY);
-    if (out >= 0) {
-      ::dup2(out, STDOUT_FILENO);
-      ::dup2(out, STDERR_FILENO);
-    }
-    if (in >= 0) {
-      ::dup2(in, STDIN_FILENO);
-    }
-    ::execv(argv[0], argv.data());
-    ::_exit(127);
+  // dup2 clears close-on-exec; a descriptor that already has the number keeps its flag, which is
+  // cleared by hand then.
+  if (handOver == kReadyFd) {
+    ::fcntl(kReadyFd, F_SETFD, 0);
+  } else if (handOver >= 0 && ::dup2(handOver, kReadyFd) < 0) {
+    ::_exit(126);
   }
+  ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+  if (::getppid() != parent) {
+    ::_exit(126);
+  }
+  const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
+  const int in = ::open("/dev/null", O_RDONLY);
+  if (out >= 0) {
+    ::dup2(out, STDOUT_FILENO);
+    ::dup2(out, STDERR_FILENO);
+  }
+  if (in >= 0) {
+    ::dup2(in, STDIN_FILENO);
+  }
+  ::execv(argv[0], argv.data());
+  ::_exit(127);
+}
+
+// Waits for `child` to end; its exit status, or -1.
+int waitFor(pid_t child) {
   int status = 0;
-  while (::waitpid(child, &status, 0) < 0 && errno == EINTR) {
+  while (::waitpid(child, &status, 0) < 0) {
+    if (errno != EINTR) {
+      return -1;
+    }
   }
   return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+// Runs a program to its end with its output going to `output`; its exit status, or -1.
+int run(std::vector<std::string> arguments, const std::string& output) {
+  const pid_t child = spawn(std::move(arguments), output);
+  return child < 0 ? -1 : waitFor(child);
 }
 
 Pki makePki() {
@@ -150,14 +176,6 @@ RedfishMock::RedfishMock(const MockOptions& options)
     arguments.emplace_back("--behave");
     arguments.push_back(behaviour);
   }
-  // Everything the child needs is ready before fork: it may only make async-signal-safe calls.
-  std::vector<char*> argv;
-  argv.reserve(arguments.size() + 1);
-  for (std::string& argument : arguments) {
-    argv.push_back(argument.data());
-  }
-  argv.push_back(nullptr);
-  const std::string output = outputFile_;
   // The mock writes its port to the pipe once it listens; reading blocks until then, and ends
   // without a port when the mock ended first (its end of the pipe closes with it). No clock and
   // no polling: a mock that never comes up is the test runner's timeout to catch.
@@ -165,38 +183,11 @@ RedfishMock::RedfishMock(const MockOptions& options)
   if (::pipe2(ready, O_CLOEXEC) != 0) {
     throw std::runtime_error("pipe failed");
   }
-  const pid_t parent = ::getpid();
-  const pid_t child = ::fork();
+  const pid_t child = spawn(std::move(arguments), outputFile_, ready[1]);
   if (child < 0) {
     ::close(ready[0]);
     ::close(ready[1]);
     throw std::runtime_error("fork failed");
-  }
-  if (child == 0) {
-    // The write end at kReadyFd, kept across exec (dup2 clears close-on-exec; a descriptor that
-    // already has the number keeps it, so the flag is cleared by hand then).
-    if (ready[1] == kReadyFd) {
-      ::fcntl(kReadyFd, F_SETFD, 0);
-    } else if (::dup2(ready[1], kReadyFd) < 0) {
-      ::_exit(126);
-    }
-    // Should the test process die without stopping it (a crash, a CTest timeout), the mock goes
-    // too instead of living on.
-    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (::getppid() != parent) {
-      ::_exit(126);
-    }
-    const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-    const int in = ::open("/dev/null", O_RDONLY);
-    if (out >= 0) {
-      ::dup2(out, STDOUT_FILENO);
-      ::dup2(out, STDERR_FILENO);
-    }
-    if (in >= 0) {
-      ::dup2(in, STDIN_FILENO);
-    }
-    ::execv(argv[0], argv.data());
-    ::_exit(127);
   }
   pid_ = child;
   ::close(ready[1]);
@@ -215,7 +206,8 @@ RedfishMock::RedfishMock(const MockOptions& options)
   ::close(ready[0]);
   if (port.empty() || port.back() != '\n') {
     stop();
-    throw std::runtime_error("the mock Redfish service ended before it listened: " + this->output());
+    throw std::runtime_error("the mock Redfish service ended before it listened: " +
+                             this->output());
   }
   port_ = static_cast<unsigned int>(std::stoul(port));
 }
@@ -229,9 +221,7 @@ void RedfishMock::stop() {
   // The mock keeps nothing worth a clean exit (its events are written line by line), and SIGKILL
   // cannot be caught, so the wait below ends.
   ::kill(pid_, SIGKILL);
-  int status = 0;
-  while (::waitpid(pid_, &status, 0) < 0 && errno == EINTR) {
-  }
+  waitFor(pid_);
   pid_ = -1;
 }
 
