@@ -136,7 +136,7 @@ Report buildReport(Operation operation, cmpihost::ObjectPathValue target,
     }
   }
   if (operation == Operation::GetInstance && report.instances.empty()) {
-    report.notes.push_back(
+    report.notes.emplace_back(
         "the provider returned neither an instance nor an error for this path; an object "
         "manager would answer its client with CIM_ERR_NOT_FOUND");
   } else if (operation == Operation::GetInstance && report.instances.size() > 1) {

@@ -370,7 +370,7 @@ std::string formatMessage(const char* defaultMessage, CMPICount count, va_list a
         values.push_back(formatReal(va_arg(args, double)));
         break;
       case CMPI_boolean:
-        values.push_back(va_arg(args, int) != 0 ? "true" : "false");
+        values.emplace_back(va_arg(args, int) != 0 ? "true" : "false");
         break;
       case CMPI_chars:
         values.push_back(textOrNull(va_arg(args, const char*)));
@@ -502,7 +502,10 @@ CMPIStatus openMessageFile(const CMPIBroker* broker, const char* msgFile,
   return okStatus();
 }
 
-CMPIStatus closeMessageFile(const CMPIBroker* broker, const CMPIMsgFileHandle msgFileHandle) {
+// The handle parameters are `const CMPIMsgFileHandle` as the function table declares them.
+CMPIStatus closeMessageFile(
+    const CMPIBroker* broker,
+    const CMPIMsgFileHandle msgFileHandle) {  // NOLINT(misc-misplaced-const)
   BrokerCore* core = enterBroker(broker, kTable, "closeMessageFile", [&](Args& args) {
     args.push_back(msgFileHandle == &messageFileToken ? "message file" : "<unknown handle>");
   });
@@ -510,8 +513,8 @@ CMPIStatus closeMessageFile(const CMPIBroker* broker, const CMPIMsgFileHandle ms
 }
 
 CMPIString* getMessage2(const CMPIBroker* broker, const char* msgId,
-                        const CMPIMsgFileHandle msgFileHandle, const char* defMsg, CMPIStatus* rc,
-                        CMPICount count, ...) {
+                        const CMPIMsgFileHandle msgFileHandle,  // NOLINT(misc-misplaced-const)
+                        const char* defMsg, CMPIStatus* rc, CMPICount count, ...) {
   BrokerCore* core = enterBroker(broker, kTable, "getMessage2", [&](Args& args) {
     args.push_back(textOrNull(msgId));
     args.push_back(msgFileHandle == &messageFileToken ? "message file" : "<unknown handle>");

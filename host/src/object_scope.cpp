@@ -17,6 +17,8 @@ thread_local std::vector<ObjectScope*> tCurrentScopes;
 class MemoryBlock final : public ManagedObject {
  public:
   MemoryBlock(ObjectScope& scope, void* address) : ManagedObject(scope), address_(address) {}
+  MemoryBlock(const MemoryBlock&) = delete;
+  MemoryBlock& operator=(const MemoryBlock&) = delete;
   ~MemoryBlock() override { std::free(address_); }
 
   void* memoryAddress() const override { return address_; }

@@ -65,8 +65,8 @@ namespace {
 // Both MI kinds are loaded alike: look up the factory, call it, and check what it returned the
 // way an object manager does before it lets the MI serve requests.
 template <class MI>
-MILoadResult<MI> createMI(const ProviderLibrary& library, std::string symbolName, Broker& broker,
-                          const CMPIContext* context) {
+MILoadResult<MI> createMI(const ProviderLibrary& library, const std::string& symbolName,
+                          Broker& broker, const CMPIContext* context) {
   MILoadResult<MI> result;
   result.symbolName = std::move(symbolName);
   std::string error;

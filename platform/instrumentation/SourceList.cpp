@@ -237,7 +237,7 @@ DiscoveryRoots discoveryRoots() {
   const char* variable = std::getenv("KESTA_DISCOVERY_ROOT");
   const std::string root = variable != nullptr ? stripSpaces(variable) : std::string();
   if (root.empty()) return roots;
-  for (std::string& device : roots.ipmiDevices) device = root + device;
+  for (std::string& device : roots.ipmiDevices) device.insert(0, root);
   roots.enclosures = root + roots.enclosures;
   roots.leds = root + roots.leds;
   return roots;

@@ -185,7 +185,7 @@ class Logger {
   void openFileLocked(const std::string& path, std::vector<std::string>& notes) {
     if (path.empty()) {
       sink_ = SinkKind::kStderr;
-      notes.push_back("VNLOG_SINK names no file after \"file:\"; writing to standard error");
+      notes.emplace_back("VNLOG_SINK names no file after \"file:\"; writing to standard error");
       return;
     }
     // O_NONBLOCK only keeps open() from waiting for a reader when the path is a FIFO; it is

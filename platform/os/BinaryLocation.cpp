@@ -23,7 +23,10 @@ std::string locateOwnBinary() {
   if (const unsigned long programHeaders = ::getauxval(AT_PHDR);
       !inMainProgram && programHeaders != 0) {
     Dl_info mainProgram = {};
-    inMainProgram = ::dladdr(reinterpret_cast<void*>(programHeaders), &mainProgram) != 0 &&
+    // The auxiliary vector gives the program headers' address as an integer.
+    inMainProgram = ::dladdr(reinterpret_cast<void*>(  // NOLINT(performance-no-int-to-ptr)
+                                 programHeaders),
+                             &mainProgram) != 0 &&
                     mainProgram.dli_fbase == self.dli_fbase;
   }
   std::error_code error;

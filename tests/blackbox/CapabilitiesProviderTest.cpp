@@ -15,7 +15,6 @@ namespace {
 
 using cmpihost::CreatingFunction;
 using cmpihost::Fault;
-using cmpihost::InstanceValue;
 using cmpihost::ObjectPathValue;
 using cmpihost::Outcome;
 using cmpihost::StatusValue;

@@ -52,6 +52,7 @@ class ExactKeyPath {
   }
   ExactKeyPath(const ExactKeyPath&) = delete;
   ExactKeyPath& operator=(const ExactKeyPath&) = delete;
+  ~ExactKeyPath() = default;
 
   CMPIObjectPath* cmpi() { return &path_; }
 

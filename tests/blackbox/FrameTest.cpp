@@ -16,7 +16,6 @@ using cmpihost::ObjectPathValue;
 using cmpihost::Outcome;
 using cmpihost::Request;
 using cmpihost::StatusValue;
-using cmpihost::Value;
 using testsupport::blueLight;
 using Texts = std::vector<std::string>;
 

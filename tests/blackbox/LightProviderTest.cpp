@@ -21,7 +21,6 @@ using cmpihost::Outcome;
 using cmpihost::StatusValue;
 using cmpihost::Value;
 using testsupport::blueLight;
-using testsupport::Node;
 using Texts = std::vector<std::string>;
 
 const std::string kProviderCategory = "Varnel.BlueLightProvider";

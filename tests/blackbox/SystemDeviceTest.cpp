@@ -73,6 +73,7 @@ std::string pairOf(const Value* group, const Value* part) {
 
 std::vector<std::string> pairsOf(const std::vector<ObjectPathValue>& paths) {
   std::vector<std::string> pairs;
+  pairs.reserve(paths.size());
   for (const ObjectPathValue& path : paths) {
     pairs.push_back(pairOf(path.findKey("GroupComponent"), path.findKey("PartComponent")));
   }
@@ -81,6 +82,7 @@ std::vector<std::string> pairsOf(const std::vector<ObjectPathValue>& paths) {
 
 std::vector<std::string> pairsOf(const std::vector<InstanceValue>& instances) {
   std::vector<std::string> pairs;
+  pairs.reserve(instances.size());
   for (const InstanceValue& instance : instances) {
     pairs.push_back(pairOf(instance.find("GroupComponent"), instance.find("PartComponent")));
   }

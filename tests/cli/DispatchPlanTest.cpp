@@ -21,7 +21,8 @@ Plan plan(const std::vector<std::string>& arguments) {
 
 std::vector<std::string> providersOf(const Plan& plan) {
   std::vector<std::string> names;
-  for (const Plan::Call& call : plan.calls) names.push_back(call.provider->name);
+  names.reserve(plan.calls.size());
+  for (const Plan::Call& call : plan.calls) names.emplace_back(call.provider->name);
   return names;
 }
 

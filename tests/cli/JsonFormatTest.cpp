@@ -10,7 +10,6 @@ namespace {
 
 using cmpihost::InstanceValue;
 using cmpihost::ObjectPathValue;
-using cmpihost::Outcome;
 using cmpihost::ResultEvent;
 using cmpihost::ResultKind;
 using cmpihost::StatusValue;

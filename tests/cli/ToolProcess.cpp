@@ -48,6 +48,7 @@ ProcessResult runProcess(const std::string& program, const std::vector<std::stri
   std::vector<std::string> argumentTexts{program};
   argumentTexts.insert(argumentTexts.end(), arguments.begin(), arguments.end());
   std::vector<char*> argv;
+  argv.reserve(argumentTexts.size() + 1);
   for (std::string& text : argumentTexts) argv.push_back(text.data());
   argv.push_back(nullptr);
 
@@ -55,8 +56,11 @@ ProcessResult runProcess(const std::string& program, const std::vector<std::stri
   for (char** entry = environ; *entry != nullptr; ++entry) {
     if (!isControlled(*entry)) environmentTexts.emplace_back(*entry);
   }
-  for (const auto& [name, value] : environment) environmentTexts.push_back(name + "=" + value);
+  for (const auto& [name, value] : environment) {
+    environmentTexts.push_back(std::string(name).append("=").append(value));
+  }
   std::vector<char*> envp;
+  envp.reserve(environmentTexts.size() + 1);
   for (std::string& text : environmentTexts) envp.push_back(text.data());
   envp.push_back(nullptr);
 

@@ -36,6 +36,10 @@ std::set<std::string> propertyNames(const InstanceValue& instance) {
 }
 
 class ComputerSystemProviderTest : public ::testing::Test {
+ public:
+  ComputerSystemProviderTest(const ComputerSystemProviderTest&) = delete;
+  ComputerSystemProviderTest& operator=(const ComputerSystemProviderTest&) = delete;
+
  protected:
   ComputerSystemProviderTest()
       : systemName_("KESTA_SYSTEM_NAME", kSystemName),
@@ -301,6 +305,7 @@ TEST_F(ComputerSystemProviderTest, ConcurrentOperationsAllSucceed) {
   constexpr int kRounds = 50;
   std::vector<int> failures(kThreads, 0);
   std::vector<std::thread> threads;
+  threads.reserve(kThreads);
   for (int t = 0; t < kThreads; ++t) {
     threads.emplace_back([&, t] {
       for (int round = 0; round < kRounds; ++round) {

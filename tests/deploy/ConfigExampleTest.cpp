@@ -16,11 +16,15 @@ namespace {
 namespace platform = Kesta::platform;
 
 class ConfigExampleTest : public ::testing::Test {
+ public:
+  ConfigExampleTest(const ConfigExampleTest&) = delete;
+  ConfigExampleTest& operator=(const ConfigExampleTest&) = delete;
+  ~ConfigExampleTest() override { platform::setConfigurationFileForTesting(""); }
+
  protected:
   ConfigExampleTest() : variable_("KESTA_INSTRUMENTATION", std::nullopt) {
     platform::setConfigurationFileForTesting(BLUELIGHT_DEPLOY_CONFIG_EXAMPLE);
   }
-  ~ConfigExampleTest() override { platform::setConfigurationFileForTesting(""); }
 
   testsupport::ScopedEnv variable_;
 };

@@ -153,7 +153,7 @@ std::vector<Registration> parseSfcbRegistration(const std::string& text, const s
     } else if (key == "namespace") {
       for (const std::string& ns : words(value)) current.namespaces.insert(ns);
     } else if (key != "group" && key != "unload") {
-      throw std::runtime_error(where + ": unknown key \"" + key + "\"");
+      throw std::runtime_error(std::string(where).append(": unknown key \"").append(key) + "\"");
     }
   }
   return result;
@@ -181,8 +181,11 @@ std::vector<Registration> pegasusRegistrations() {
     for (const mof::Instance* provider : doc.instancesOf("PG_Provider")) {
       const std::string& module = provider->text("ProviderModuleName");
       if (modules.count(module) == 0) {
-        throw std::runtime_error(file + ": PG_Provider " + provider->text("Name") +
-                                 " names the unknown module " + module);
+        throw std::runtime_error(std::string(file)
+                                     .append(": PG_Provider ")
+                                     .append(provider->text("Name"))
+                                     .append(" names the unknown module ")
+                                     .append(module));
       }
       providers.emplace(module, provider->text("Name"));
     }
@@ -190,9 +193,13 @@ std::vector<Registration> pegasusRegistrations() {
       const std::string& module = capability->text("ProviderModuleName");
       const std::string& provider = capability->text("ProviderName");
       if (providers.count({module, provider}) == 0) {
-        throw std::runtime_error(
-            file + ": PG_ProviderCapabilities " + capability->text("CapabilityID") +
-            " names a provider that is not registered: " + module + "/" + provider);
+        throw std::runtime_error(std::string(file)
+                                     .append(": PG_ProviderCapabilities ")
+                                     .append(capability->text("CapabilityID"))
+                                     .append(" names a provider that is not registered: ")
+                                     .append(module)
+                                     .append("/")
+                                     .append(provider));
       }
       Registration registration;
       registration.className = capability->text("ClassName");

@@ -261,7 +261,7 @@ class Parser {
       } else if (isPunct("{")) {
         qualifier.value = value();
       } else {
-        qualifier.value.items.push_back("true");
+        qualifier.value.items.emplace_back("true");
       }
       if (isPunct(":")) {  // flavours
         next();

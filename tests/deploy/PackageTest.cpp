@@ -66,7 +66,7 @@ class DebianPackage : public ::testing::Test {
   // The package is built and unpacked by the CTest fixture deploy.package.build
   // (BuildPackage.cmake); these tests only read what it left.
   static void SetUpTestSuite() {
-    if (std::string(BLUELIGHT_DEPLOY_SANITIZERS).size() > 0) {
+    if (!std::string(BLUELIGHT_DEPLOY_SANITIZERS).empty()) {
       skip_ = "a build with sanitizers (" BLUELIGHT_DEPLOY_SANITIZERS ") is not packaged";
       return;
     }

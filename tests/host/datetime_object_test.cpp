@@ -23,7 +23,7 @@ TEST_F(DateTimeObjectTest, FromBinary) {
 }
 
 TEST_F(DateTimeObjectTest, Interval) {
-  const CMPIUint64 micros = ((3ULL * 24 + 4) * 3600 + 5 * 60 + 6) * 1000000ULL + 7;
+  const CMPIUint64 micros = ((3ULL * 24 + 4) * 3600 + 5ULL * 60 + 6) * 1000000ULL + 7;
   CMPIDateTime* dateTime = CMNewDateTimeFromBinary(mb(), micros, 1, nullptr);
   EXPECT_EQ(CMIsInterval(dateTime, nullptr), 1);
   EXPECT_EQ(text(CMGetStringFormat(dateTime, nullptr)), "00000003040506.000007:000");

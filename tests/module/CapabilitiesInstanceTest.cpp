@@ -15,8 +15,9 @@ const Names kBoth = {"InstanceID", "RequestedAlarmStatesSupported"};
 const Names kKeyOnly = {"InstanceID"};
 const std::string kMakeList = " broker=PTR ref=PTR bluelightCap=PTR properties=";
 
-Value states(std::vector<unsigned short> values) {
+Value states(const std::vector<unsigned short>& values) {
   std::vector<Value> elements;
+  elements.reserve(values.size());
   for (unsigned short v : values) elements.push_back(Value::uint16(v));
   return Value::array(CMPI_uint16, elements);
 }

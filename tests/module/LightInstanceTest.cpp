@@ -207,10 +207,10 @@ TEST_F(FactoryTest, ArrayFailureWithAPropertyListStopsAtOperationalStatus) {
 
 TEST_F(FactoryTest, ObjectPathFailureGivesNullSilently) {
   BlueLightFactory factory;
-  for (auto fault : {Fault::nullResult(CreatingFunction::NewObjectPath),
-                     Fault::nullHandle(CreatingFunction::NewObjectPath),
-                     Fault::nullResult(CreatingFunction::NewInstance),
-                     Fault::nullHandle(CreatingFunction::NewInstance)}) {
+  for (const auto& fault : {Fault::nullResult(CreatingFunction::NewObjectPath),
+                            Fault::nullHandle(CreatingFunction::NewObjectPath),
+                            Fault::nullResult(CreatingFunction::NewInstance),
+                            Fault::nullHandle(CreatingFunction::NewInstance)}) {
     log_.clear();
     broker_.clearRecords();
     broker_.armFault(fault);

@@ -306,6 +306,7 @@ TEST_F(IpmiSimulatorTest, SeveralOperationsReadAtOnce) {
   const std::string text = bmc.sourceText();
   std::atomic<int> wrong{0};
   std::vector<std::thread> readers;
+  readers.reserve(8);
   for (int t = 0; t < 8; ++t) {
     readers.emplace_back([&] {
       for (int i = 0; i < 50; ++i) {

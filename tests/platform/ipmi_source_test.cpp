@@ -270,6 +270,7 @@ TEST_F(IpmiSourceTest, SeveralThreadsReadAtOnce) {
   const std::unique_ptr<IpmiSource> shared = source();
   std::atomic<int> wrong{0};
   std::vector<std::thread> readers;
+  readers.reserve(8);
   for (int t = 0; t < 8; ++t) {
     readers.emplace_back([&] {
       for (int i = 0; i < 200; ++i) {

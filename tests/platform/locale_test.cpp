@@ -39,8 +39,10 @@ std::string builtCatalogue(const std::string& language) {
 // The four variables that choose the language, all cleared unless a test sets them.
 class LanguageEnvironment {
  public:
-  LanguageEnvironment(std::optional<std::string> kesta, std::optional<std::string> all,
-                      std::optional<std::string> messages, std::optional<std::string> lang)
+  LanguageEnvironment(const std::optional<std::string>& kesta,
+                      const std::optional<std::string>& all,
+                      const std::optional<std::string>& messages,
+                      const std::optional<std::string>& lang)
       : kesta_("KESTA_LANGUAGE", kesta),
         all_("LC_ALL", all),
         messages_("LC_MESSAGES", messages),
@@ -268,6 +270,7 @@ TEST(Locale, ConcurrentLookups) {
   const std::vector<std::pair<std::string, std::wstring>> expected = {
       {"en", L"Blue Light"}, {"de", L"Blaue Leuchte"}, {"fr", L"Voyant bleu"}};
   std::vector<std::thread> threads;
+  threads.reserve(6);
   std::atomic<int> wrong{0};
   for (int t = 0; t < 6; ++t) {
     threads.emplace_back([&expected, &wrong, t] {

@@ -252,6 +252,7 @@ TEST(Logger, ConcurrentWritersNeverInterleave) {
   constexpr int kThreads = 8;
   constexpr int kLinesEach = 2000;
   std::vector<std::thread> threads;
+  threads.reserve(kThreads);
   for (int t = 0; t < kThreads; ++t) {
     threads.emplace_back([t] {
       // Long lines make torn writes likely if writes were not whole lines.
@@ -294,6 +295,7 @@ TEST(Logger, ReconfigureWhileOthersWrite) {
   VNLogger::reconfigure();
   std::atomic<bool> stop{false};
   std::vector<std::thread> writers;
+  writers.reserve(4);
   for (int t = 0; t < 4; ++t) {
     writers.emplace_back([&stop] {
       while (!stop.load()) {

@@ -66,10 +66,11 @@ TEST(SystemName, ConcurrentCallersAgree) {
   const std::string expected = expectedHostName();
   std::vector<std::string> results(8);
   std::vector<std::thread> threads;
-  for (std::size_t i = 0; i < results.size(); ++i) {
-    threads.emplace_back([&results, i] {
+  threads.reserve(results.size());
+  for (std::string& result : results) {
+    threads.emplace_back([&result] {
       for (int round = 0; round < 100; ++round) {
-        results[i] = Kesta::getSystemName();
+        result = Kesta::getSystemName();
       }
     });
   }

@@ -56,6 +56,7 @@ class ConcurrencyTest : public ::testing::Test {
   static void onEveryThread(const std::function<void(int)>& work) {
     std::atomic<bool> go{false};
     std::vector<std::thread> threads;
+    threads.reserve(kThreads);
     for (int t = 0; t < kThreads; ++t) {
       threads.emplace_back([&go, &work, t] {
         while (!go.load()) std::this_thread::yield();

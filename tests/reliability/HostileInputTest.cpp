@@ -120,8 +120,9 @@ struct NamedList {
 
 std::vector<NamedList> hostileLists() {
   std::vector<std::string> many;
+  many.reserve(1000);
   for (int i = 0; i < 998; ++i) many.push_back("Unknown" + std::to_string(i));
-  many.push_back("AlarmState");
+  many.emplace_back("AlarmState");
   many.push_back(kAlarmStates);
   return {
       {"null", std::nullopt},
@@ -324,7 +325,7 @@ TEST_F(HostileInputTest, InstanceEnumerationsLookOnlyAtTheNamespaceOfTheirPath) 
     for (Spoil spoil : kSpoils) {
       SCOPED_TRACE(e.name + " enumerations with " + spoilName(spoil));
       const ObjectPathValue ref = spoilt(base, spoil);
-      const std::string nameSpace = ref.nameSpace();
+      const std::string& nameSpace = ref.nameSpace();
       const Outcome names = cmpihost::enumerateInstanceNames(broker_, e.mi, ref);
       expectSane(names);
       EXPECT_EQ(names.status, StatusValue(CMPI_RC_OK));
@@ -479,7 +480,8 @@ TEST_F(HostileInputTest, AssociationOperationsWithSpoiltPaths) {
         EXPECT_EQ(codes(outcome), "");
         if (!silent) {
           ASSERT_FALSE(traces(outcome).empty());
-          EXPECT_EQ(traces(outcome).back(), "2 " + component + ": " + text);
+          EXPECT_EQ(traces(outcome).back(),
+                    std::string("2 ").append(component).append(": ") + text);
         }
       } else {
         // The class of the source decides; its keys and namespace are only carried along.
@@ -592,10 +594,10 @@ TEST_P(TreeSizeTest, CountsAreTakenIn16Bits) {
     if (!big && filed == 0) {
       std::vector<std::string> expected;
       if (op.name.find("AssociatorNames") != std::string::npos) {
-        expected.push_back(
+        expected.emplace_back(
             "1 BlueLightElementCapabilitiesProvider: Target Class is BlueLightClass");
       }
-      expected.push_back("1 BlueLightProfileProvider: ***No instance found***");
+      expected.emplace_back("1 BlueLightProfileProvider: ***No instance found***");
       EXPECT_EQ(traces(outcome), expected);
     }
     if (filed == 1) {

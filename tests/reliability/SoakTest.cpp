@@ -32,6 +32,7 @@ TEST(SoakTest, HundredThousandOperationsKeepResidentMemoryFlat) {
   const std::vector<Operation> operations = readOperations(broker, mis);
 
   std::vector<std::string> expected;
+  expected.reserve(operations.size());
   for (const Operation& operation : operations) {
     expected.push_back(render(operation.run(broker, mis)));
   }

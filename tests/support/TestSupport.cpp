@@ -140,7 +140,7 @@ std::vector<LogLine> LogCapture::lines() const {
     std::getline(fields, level, '\t');
     std::getline(fields, parsed.kind, '\t');
     std::getline(fields, parsed.text);
-    parsed.level = std::atoi(level.c_str());
+    parsed.level = static_cast<int>(std::strtol(level.c_str(), nullptr, 10));
     result.push_back(parsed);
   }
   return result;

@@ -80,7 +80,7 @@ class SnapshotDiagnosis {
     kProperties = 1U << 4,
   };
 
-  [[noreturn]] static void fail(std::string reason) { throw SourceError(std::move(reason)); }
+  [[noreturn]] static void fail(const std::string& reason) { throw SourceError(reason); }
 
   // A syntax error at the current position; without `problem` it names the character there.
   [[noreturn]] void syntaxError(std::string problem = std::string()) const {

@@ -42,7 +42,7 @@ constexpr std::size_t kBytesPerNodeEstimate = 96;
 // for every call costs page faults that, on a tree of 65,537 nodes, took as long as the parse
 // (docs/PERFORMANCE.md). They serve texts up to this size; a larger text gets buffers of its own
 // for the call, so that one huge snapshot does not hold its memory for the life of the process.
-constexpr std::size_t kLargestKeptText = 16 * 1024 * 1024;
+constexpr std::size_t kLargestKeptText = std::size_t{16} * 1024 * 1024;
 
 // Thrown on the first broken rule. The reader does not say what is wrong: SnapshotDiagnosis
 // does that for the texts it refuses. `error` is simdjson's error, if it was one.
@@ -241,7 +241,9 @@ class Reader {
       refuse();
     }
     for (auto element : array) {
-      od::value node = take(std::move(element));
+      // take() wants the result as an rvalue; this one is trivially copyable, so the move is a
+      // copy.
+      od::value node = take(std::move(element));  // NOLINT(performance-move-const-arg)
       od::object object;
       if (node.get_object().get(object) != simdjson::SUCCESS) {
         skip(node);
@@ -420,7 +422,8 @@ class Reader {
             ++container.members;
           }
           container.started = true;
-          if (!(container.members != container.members)) {
+          // simdjson's iterators compare with anything as "not yet at the end".
+          if (!(container.members != container.members)) {  // NOLINT(misc-redundant-expression)
             open_.pop_back();
             continue;
           }
@@ -432,7 +435,7 @@ class Reader {
             ++container.elements;
           }
           container.started = true;
-          if (!(container.elements != container.elements)) {
+          if (!(container.elements != container.elements)) {  // NOLINT(misc-redundant-expression)
             open_.pop_back();
             continue;
           }

@@ -20,7 +20,7 @@ namespace platform {
 namespace {
 
 // Attribute files are one page; trigger lists may be longer on kernels with many triggers.
-constexpr std::size_t kAttributeLimit = 64 * 1024;
+constexpr std::size_t kAttributeLimit = std::size_t{64} * 1024;
 
 constexpr std::array<std::string_view, 5> kIdentificationWords = {"identify", "identification",
                                                                   "locate", "locator", "uid"};
