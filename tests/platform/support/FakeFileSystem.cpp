@@ -311,57 +311,59 @@ int FakeFileSystem::handOut(Open open) {
   return fd;
 }
 
-int FakeFileSystem::openForReading(int directory, const std::string& path) {
-  std::lock_guard<std::mutex> lock(mutex_);
+int FakeFileSystem::begin(Call call, int directory, const std::string& path, std::string& name) {
   int error = 0;
-  const std::string name = nameOf(directory, path, error);
-  record(Call::Open, name);
+  name = nameOf(directory, path, error);
+  record(call, name);
   if (error == 0) {
-    error = failure(Call::Open, name);
+    error = failure(call, name);
   }
-  if (error != 0) {
-    return -error;
+  return -error;
+}
+
+FakeFileSystem::Open* FakeFileSystem::begin(Call call, int fd, int& result) {
+  const auto found = open_.find(fd);
+  if (found == open_.end()) {
+    result = -EBADF;
+    return nullptr;
+  }
+  record(call, found->second.name);
+  result = -failure(call, found->second.name);
+  return result == 0 ? &found->second : nullptr;
+}
+
+int FakeFileSystem::openEntry(Call call, int directory, const std::string& path) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  std::string name;
+  if (const int result = begin(call, directory, path, name); result != 0) {
+    return result;
   }
   if (real_) {
-    const int fd = systemFileSystem()->openForReading(directory, path);
+    const std::shared_ptr<FileSystem> system = systemFileSystem();
+    const int fd = call == Call::OpenDirectory ? system->openDirectory(directory, path)
+                                               : system->openForReading(directory, path);
     if (fd >= 0) {
       open_.emplace(fd, Open{name, std::string(), 0});
     }
     return fd;
   }
+  int error = 0;
   const std::string resolved = resolve(name, true, error);
   if (resolved.empty()) {
     return -error;
+  }
+  if (call == Call::OpenDirectory && entries_.at(resolved).kind != Kind::Directory) {
+    return -ENOTDIR;
   }
   return handOut(Open{name, resolved, 0});
 }
 
+int FakeFileSystem::openForReading(int directory, const std::string& path) {
+  return openEntry(Call::Open, directory, path);
+}
+
 int FakeFileSystem::openDirectory(int directory, const std::string& path) {
-  std::lock_guard<std::mutex> lock(mutex_);
-  int error = 0;
-  const std::string name = nameOf(directory, path, error);
-  record(Call::OpenDirectory, name);
-  if (error == 0) {
-    error = failure(Call::OpenDirectory, name);
-  }
-  if (error != 0) {
-    return -error;
-  }
-  if (real_) {
-    const int fd = systemFileSystem()->openDirectory(directory, path);
-    if (fd >= 0) {
-      open_.emplace(fd, Open{name, std::string(), 0});
-    }
-    return fd;
-  }
-  const std::string resolved = resolve(name, true, error);
-  if (resolved.empty()) {
-    return -error;
-  }
-  if (entries_.at(resolved).kind != Kind::Directory) {
-    return -ENOTDIR;
-  }
-  return handOut(Open{name, resolved, 0});
+  return openEntry(Call::OpenDirectory, directory, path);
 }
 
 int FakeFileSystem::close(int fd) {
@@ -382,15 +384,12 @@ int FakeFileSystem::close(int fd) {
 
 long FakeFileSystem::read(int fd, char* buffer, std::size_t size) {
   std::lock_guard<std::mutex> lock(mutex_);
-  const auto found = open_.find(fd);
-  if (found == open_.end()) {
-    return -EBADF;
+  int result = 0;
+  Open* const opened = begin(Call::Read, fd, result);
+  if (opened == nullptr) {
+    return result;
   }
-  Open& open = found->second;
-  record(Call::Read, open.name);
-  if (const int error = failure(Call::Read, open.name); error != 0) {
-    return -error;
-  }
+  Open& open = *opened;
   if (real_) {
     return systemFileSystem()->read(fd, buffer, size);
   }
@@ -414,15 +413,12 @@ long FakeFileSystem::read(int fd, char* buffer, std::size_t size) {
 
 int FakeFileSystem::fstat(int fd, struct stat& info) {
   std::lock_guard<std::mutex> lock(mutex_);
-  const auto found = open_.find(fd);
-  if (found == open_.end()) {
-    return -EBADF;
+  int result = 0;
+  const Open* const opened = begin(Call::Fstat, fd, result);
+  if (opened == nullptr) {
+    return result;
   }
-  const Open& open = found->second;
-  record(Call::Fstat, open.name);
-  if (const int error = failure(Call::Fstat, open.name); error != 0) {
-    return -error;
-  }
+  const Open& open = *opened;
   if (real_) {
     if (const int result = systemFileSystem()->fstat(fd, info); result != 0) {
       return result;
@@ -440,20 +436,16 @@ int FakeFileSystem::fstat(int fd, struct stat& info) {
 
 int FakeFileSystem::statAt(int directory, const std::string& path, struct stat& info) {
   std::lock_guard<std::mutex> lock(mutex_);
-  int error = 0;
-  const std::string name = nameOf(directory, path, error);
-  record(Call::StatAt, name);
-  if (error == 0) {
-    error = failure(Call::StatAt, name);
-  }
-  if (error != 0) {
-    return -error;
+  std::string name;
+  if (const int result = begin(Call::StatAt, directory, path, name); result != 0) {
+    return result;
   }
   if (real_) {
     if (const int result = systemFileSystem()->statAt(directory, path, info); result != 0) {
       return result;
     }
   } else {
+    int error = 0;
     const std::string resolved = resolve(name, true, error);
     if (resolved.empty()) {
       return -error;
@@ -466,18 +458,14 @@ int FakeFileSystem::statAt(int directory, const std::string& path, struct stat& 
 
 int FakeFileSystem::readLinkAt(int directory, const std::string& path, std::string& target) {
   std::lock_guard<std::mutex> lock(mutex_);
-  int error = 0;
-  const std::string name = nameOf(directory, path, error);
-  record(Call::ReadLink, name);
-  if (error == 0) {
-    error = failure(Call::ReadLink, name);
-  }
-  if (error != 0) {
-    return -error;
+  std::string name;
+  if (const int result = begin(Call::ReadLink, directory, path, name); result != 0) {
+    return result;
   }
   if (real_) {
     return systemFileSystem()->readLinkAt(directory, path, target);
   }
+  int error = 0;
   const std::string resolved = resolve(name, false, error);
   if (resolved.empty()) {
     return -error;
@@ -492,15 +480,12 @@ int FakeFileSystem::readLinkAt(int directory, const std::string& path, std::stri
 
 int FakeFileSystem::listDirectory(int fd, std::vector<std::string>& names) {
   std::lock_guard<std::mutex> lock(mutex_);
-  const auto found = open_.find(fd);
-  if (found == open_.end()) {
-    return -EBADF;
+  int result = 0;
+  const Open* const opened = begin(Call::List, fd, result);
+  if (opened == nullptr) {
+    return result;
   }
-  const Open& open = found->second;
-  record(Call::List, open.name);
-  if (const int error = failure(Call::List, open.name); error != 0) {
-    return -error;
-  }
+  const Open& open = *opened;
   if (real_) {
     return systemFileSystem()->listDirectory(fd, names);
   }

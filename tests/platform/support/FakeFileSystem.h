@@ -109,6 +109,15 @@ class FakeFileSystem final : public Kesta::platform::FileSystem {
   void addEntry(const std::string& path, Entry entry);
   struct stat statusOf(const Entry& entry) const;
   int handOut(Open open);
+  // What every call on a path does first: the name it stands for, the record of the call, and
+  // an injected failure. 0 to go on, else minus the error.
+  int begin(Call call, int directory, const std::string& path, std::string& name);
+  // The same for a call on a descriptor: its open file, or null with `result` set to minus the
+  // error (EBADF for a descriptor that is not open).
+  Open* begin(Call call, int fd, int& result);
+  // Opens a file (Call::Open) or a directory (Call::OpenDirectory); the one member that takes
+  // mutex_ itself.
+  int openEntry(Call call, int directory, const std::string& path);
 
   const bool real_;
   mutable std::mutex mutex_;
