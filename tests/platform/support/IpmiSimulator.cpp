@@ -1,5 +1,7 @@
 #include "IpmiSimulator.h"
 
+#include "ChildProcess.h"
+
 #include <arpa/inet.h>
 #include <fcntl.h>
 #include <netinet/in.h>
@@ -28,7 +30,6 @@ using namespace std::chrono_literals;
 using Clock = std::chrono::steady_clock;
 
 constexpr auto kStartTimeout = 5s;
-constexpr auto kStopGrace = 2s;
 constexpr int kStartAttempts = 3;
 
 bool isExecutable(const std::string& path) {
@@ -198,40 +199,13 @@ bool IpmiSimulator::startOnce(const SimulatorOptions& options, std::string& why)
   }
   const std::string emu = config + "/bmc.emu";
 
-  // Everything the child needs is ready before fork: it may only make async-signal-safe calls.
-  std::vector<std::string> arguments = {executable, "-c", lanConf, "-f", emu, "-s", state, "-n"};
-  std::vector<char*> argv;
-  argv.reserve(arguments.size() + 1);
-  for (std::string& argument : arguments) {
-    argv.push_back(argument.data());
-  }
-  argv.push_back(nullptr);
-  const std::string output = outputFile_;
-  const pid_t parent = ::getpid();
-
-  const pid_t child = ::fork();
+  // Should the test process die without stopping it (a crash, a CTest timeout), the simulator
+  // goes too instead of holding its port.
+  const pid_t child = platform_test::spawnChild(
+      {executable, "-c", lanConf, "-f", emu, "-s", state, "-n"}, outputFile_);
   if (child < 0) {
     why = "fork failed";
     return false;
-  }
-  if (child == 0) {
-    // Should the test process die without stopping it (a crash, a CTest timeout), the
-    // simulator goes too instead of holding its port.
-    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-    if (::getppid() != parent) {
-      ::_exit(126);
-    }
-    const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-    const int in = ::open("/dev/null", O_RDONLY);
-    if (out >= 0) {
-      ::dup2(out, STDOUT_FILENO);
-      ::dup2(out, STDERR_FILENO);
-    }
-    if (in >= 0) {
-      ::dup2(in, STDIN_FILENO);
-    }
-    ::execv(argv[0], argv.data());
-    ::_exit(127);
   }
   pid_ = child;
 
@@ -256,18 +230,8 @@ void IpmiSimulator::stop() {
   if (pid_ <= 0) {
     return;
   }
-  ::kill(pid_, SIGTERM);
-  const Clock::time_point giveUp = Clock::now() + kStopGrace;
-  int status = 0;
-  while (Clock::now() < giveUp) {
-    if (::waitpid(pid_, &status, WNOHANG) == pid_) {
-      pid_ = -1;
-      return;
-    }
-    std::this_thread::sleep_for(5ms);
-  }
-  ::kill(pid_, SIGKILL);
-  ::waitpid(pid_, &status, 0);
+  // The simulator keeps nothing worth a clean exit; SIGKILL cannot be caught, so the wait ends.
+  platform_test::killChild(pid_);
   pid_ = -1;
 }
 

@@ -1,5 +1,7 @@
 #include "RedfishMock.h"
 
+#include "ChildProcess.h"
+
 #include <fcntl.h>
 #include <signal.h>
 #include <sys/prctl.h>
@@ -31,63 +33,6 @@ bool exists(const std::string& path) {
   return !path.empty() && ::stat(path.c_str(), &info) == 0;
 }
 
-// Starts `arguments` with standard output and error appended to `output` and standard input from
-// /dev/null. The child dies with this process (a crash, a test runner's timeout), so no mock
-// outlives its test. `handOver`, unless -1, is a descriptor the child gets as kReadyFd. Everything
-// is prepared before fork: the child makes only async-signal-safe calls. -1 when fork fails.
-pid_t spawn(std::vector<std::string> arguments, const std::string& output, int handOver = -1) {
-  std::vector<char*> argv;
-  argv.reserve(arguments.size() + 1);
-  for (std::string& argument : arguments) {
-    argv.push_back(argument.data());
-  }
-  argv.push_back(nullptr);
-  const pid_t parent = ::getpid();
-  const pid_t child = ::fork();
-  if (child != 0) {
-    return child;
-  }
-  // dup2 clears close-on-exec; a descriptor that already has the number keeps its flag, which is
-  // cleared by hand then.
-  if (handOver == kReadyFd) {
-    ::fcntl(kReadyFd, F_SETFD, 0);
-  } else if (handOver >= 0 && ::dup2(handOver, kReadyFd) < 0) {
-    ::_exit(126);
-  }
-  ::prctl(PR_SET_PDEATHSIG, SIGKILL);
-  if (::getppid() != parent) {
-    ::_exit(126);
-  }
-  const int out = ::open(output.c_str(), O_WRONLY | O_CREAT | O_APPEND, 0600);
-  const int in = ::open("/dev/null", O_RDONLY);
-  if (out >= 0) {
-    ::dup2(out, STDOUT_FILENO);
-    ::dup2(out, STDERR_FILENO);
-  }
-  if (in >= 0) {
-    ::dup2(in, STDIN_FILENO);
-  }
-  ::execv(argv[0], argv.data());
-  ::_exit(127);
-}
-
-// Waits for `child` to end; its exit status, or -1.
-int waitFor(pid_t child) {
-  int status = 0;
-  while (::waitpid(child, &status, 0) < 0) {
-    if (errno != EINTR) {
-      return -1;
-    }
-  }
-  return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
-
-// Runs a program to its end with its output going to `output`; its exit status, or -1.
-int run(std::vector<std::string> arguments, const std::string& output) {
-  const pid_t child = spawn(std::move(arguments), output);
-  return child < 0 ? -1 : waitFor(child);
-}
-
 Pki makePki() {
   const long days = static_cast<long>(std::time(nullptr) / 86400);
   const std::string root = REDFISH_TEST_PKI_ROOT;
@@ -110,7 +55,8 @@ Pki makePki() {
     throw std::runtime_error("cannot make a folder in " + root);
   }
   const std::string log = scratch + ".log";
-  const int status = run({REDFISH_TEST_PYTHON, REDFISH_TEST_MOCK, "pki", scratch}, log);
+  const int status =
+      platform_test::runChild({REDFISH_TEST_PYTHON, REDFISH_TEST_MOCK, "pki", scratch}, log);
   if (status != 0) {
     const std::string why = testsupport::readFile(log);
     std::filesystem::remove_all(scratch);
@@ -183,7 +129,8 @@ RedfishMock::RedfishMock(const MockOptions& options)
   if (::pipe2(ready, O_CLOEXEC) != 0) {
     throw std::runtime_error("pipe failed");
   }
-  const pid_t child = spawn(std::move(arguments), outputFile_, ready[1]);
+  const pid_t child =
+      platform_test::spawnChild(std::move(arguments), outputFile_, ready[1], kReadyFd);
   if (child < 0) {
     ::close(ready[0]);
     ::close(ready[1]);
@@ -220,8 +167,7 @@ void RedfishMock::stop() {
   }
   // The mock keeps nothing worth a clean exit (its events are written line by line), and SIGKILL
   // cannot be caught, so the wait below ends.
-  ::kill(pid_, SIGKILL);
-  waitFor(pid_);
+  platform_test::killChild(pid_);
   pid_ = -1;
 }
 
