@@ -68,7 +68,7 @@ template <class MI>
 MILoadResult<MI> createMI(const ProviderLibrary& library, const std::string& symbolName,
                           Broker& broker, const CMPIContext* context) {
   MILoadResult<MI> result;
-  result.symbolName = std::move(symbolName);
+  result.symbolName = symbolName;
   std::string error;
   void* address = library.symbol(result.symbolName, &error);
   if (address == nullptr) {

@@ -39,6 +39,9 @@ class ComputerSystemProviderTest : public ::testing::Test {
  public:
   ComputerSystemProviderTest(const ComputerSystemProviderTest&) = delete;
   ComputerSystemProviderTest& operator=(const ComputerSystemProviderTest&) = delete;
+  ~ComputerSystemProviderTest() override {
+    if (load_.ok()) cmpihost::cleanup(broker_, load_.mi);
+  }
 
  protected:
   ComputerSystemProviderTest()
@@ -46,10 +49,6 @@ class ComputerSystemProviderTest : public ::testing::Test {
         library_(deploy::libraryPathFor("kestacomputersystemprovider")) {
     cmpihost::Request request(broker_);
     load_ = cmpihost::createInstanceMI(library_, kProvider, broker_, request);
-  }
-
-  ~ComputerSystemProviderTest() override {
-    if (load_.ok()) cmpihost::cleanup(broker_, load_.mi);
   }
 
   void SetUp() override { ASSERT_TRUE(load_.ok()) << load_.error; }

@@ -201,8 +201,8 @@ TEST(ProviderException, HoldsItsMessage) {
   Kesta::ProviderException error("Failed while setting Device ID");
   EXPECT_STREQ(error.what(), "Failed while setting Device ID");
   // A copy of its own is what the test is about.
-  const Kesta::ProviderException copy(
-      error);  // NOLINT(performance-unnecessary-copy-initialization)
+  // NOLINTNEXTLINE(performance-unnecessary-copy-initialization)
+  const Kesta::ProviderException copy(error);
   EXPECT_STREQ(copy.what(), "Failed while setting Device ID");
   EXPECT_NE(copy.what(), error.what());
 }
