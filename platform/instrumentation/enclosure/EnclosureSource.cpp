@@ -9,7 +9,7 @@
 #include <utility>
 
 #include "KestaCommonBase.h"
-#include "VNLog.h"
+#include "instrumentation/SourceLog.h"
 #include "instrumentation/SourceOptions.h"
 #include "os/FileIo.h"
 #include "text/Text.h"
@@ -23,11 +23,6 @@ constexpr const char* kScheme = "enclosure:";
 
 // An attribute is one page at most; the kernel reports 4096 as its size whatever it holds.
 constexpr std::size_t kAttributeLimit = 4096;
-
-// The same category and level as every other instrumentation failure, so one log filter catches
-// them all.
-constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
-constexpr int kFailureLevel = 6000;
 
 // How much of an attribute's unexpected content a log line quotes: enough to recognise it, not
 // a page of it.
@@ -82,9 +77,7 @@ std::string quotedContent(std::string_view text) {
 }
 
 void logFailure(const std::string& source, const std::string& what) {
-  VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,
-                                   0, 0,
-                                   "Instrumentation source \"" + printable(source) + "\" " + what);
+  logSourceProblem(describeSource(source, "") + " " + what);
 }
 
 // One component with a locate light, before its light is read.

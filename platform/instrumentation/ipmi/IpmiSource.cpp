@@ -5,7 +5,7 @@
 #include <utility>
 
 #include "KestaCommonBase.h"
-#include "VNLog.h"
+#include "instrumentation/SourceLog.h"
 #include "instrumentation/SourceOptions.h"
 #include "instrumentation/ipmi/IpmiCredentials.h"
 #include "instrumentation/ipmi/IpmiDeviceTransport.h"
@@ -19,11 +19,6 @@ namespace {
 
 constexpr const char* kDeviceScheme = "ipmi:";
 constexpr const char* kLanScheme = "ipmi-lan:";
-
-// The same category and level as every other instrumentation failure, so one log filter catches
-// them all.
-constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
-constexpr int kFailureLevel = 6000;
 
 // Takes the shared options out of `options`; whatever remains is unknown.
 IpmiSourceOptions takeSharedOptions(std::map<std::string, std::string>& options) {
@@ -44,10 +39,7 @@ IpmiSourceOptions takeSharedOptions(std::map<std::string, std::string>& options)
 }
 
 void logUnreadable(const std::string& source, const std::string& why) {
-  VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,
-                                   0, 0,
-                                   "Instrumentation source \"" + printable(source) +
-                                       "\" cannot read the identify light: " + why);
+  logSourceProblem(describeSource(source, "") + " cannot read the identify light: " + why);
 }
 
 }  // namespace

@@ -3,8 +3,8 @@
 #include <map>
 #include <utility>
 
-#include "VNLog.h"
 #include "instrumentation/SourceError.h"
+#include "instrumentation/SourceLog.h"
 #include "instrumentation/SourceOptions.h"
 #include "instrumentation/redfish/RedfishCredentials.h"
 #include "instrumentation/redfish/RedfishTransport.h"
@@ -19,19 +19,12 @@ namespace {
 constexpr const char* kScheme = "redfish:";
 constexpr const char* kServiceScheme = "https://";
 
-// The same category and level as every other instrumentation failure, so one log filter catches
-// them all.
-constexpr const char* kCategory = "Kesta.Platform.Instrumentation";
-constexpr int kFailureLevel = 6000;
-
 // A file of certificate authorities is read only to see that it can be; the system's own bundle is
 // a few hundred kilobytes, so anything far bigger is the wrong file.
 constexpr std::size_t kCaFileLimit = std::size_t{16} * 1024 * 1024;
 
 void logLine(const std::string& source, const std::string& text) {
-  VNLog::VNLogger::logLevelMessage(__func__, __FILE__, __LINE__, kCategory, kFailureLevel, nullptr,
-                                   0, 0,
-                                   "Instrumentation source \"" + printable(source) + "\" " + text);
+  logSourceProblem(describeSource(source, "") + " " + text);
 }
 
 bool parseYesNo(const std::string& name, const std::string& value) {
